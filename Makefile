@@ -1,0 +1,60 @@
+# Thin wrapper over the CMake presets; see README.md.
+#   make          install what is missing, build, run `zmtool demo`
+#   make test     install what is missing, build, run the whole test suite
+#   make asan     the same tests under AddressSanitizer + UndefinedBehaviorSanitizer
+#   make tsan     the same tests under ThreadSanitizer
+#   make bench    release build, run the benchmarks, write docs/benchmarks.md
+#   make fuzz     clang build, run every fuzz target for FUZZ_SECONDS (default 60) each
+#   make install  install into PREFIX (default /usr/local)
+#   make format   clang-format every source file
+SHELL := /bin/bash
+FUZZ_SECONDS ?= 60
+PREFIX ?= /usr/local
+
+.PHONY: all deps build demo test asan tsan bench fuzz install format clean
+
+all: demo
+
+deps:
+	@tools/install-deps.sh
+
+build: deps
+	cmake --preset default
+	cmake --build --preset default
+
+demo: build
+	./build/default/tools/zmtool/zmtool demo
+
+test: build
+	ctest --preset default
+
+asan: deps
+	cmake --preset asan
+	cmake --build --preset asan
+	ctest --preset asan
+
+tsan: deps
+	cmake --preset tsan
+	cmake --build --preset tsan
+	ctest --preset tsan
+
+bench:
+	@tools/install-deps.sh bench
+	cmake --preset release
+	cmake --build --preset release
+	bench/run-benchmarks.sh build/release docs/benchmarks.md
+
+fuzz:
+	@tools/install-deps.sh fuzz
+	cmake --preset fuzz
+	cmake --build --preset fuzz --target fuzzers
+	fuzz/run-fuzzers.sh build/fuzz $(FUZZ_SECONDS)
+
+install: build
+	cmake --install build/default --prefix $(PREFIX)
+
+format:
+	git ls-files '*.h' '*.cpp' | xargs clang-format -i
+
+clean:
+	rm -rf build

@@ -1,0 +1,62 @@
+// Runs a fuzz target over every file of the directories (or files) named on the command line, as
+// libFuzzer would run its corpus, for builds without libFuzzer.
+#include <cstdint>
+#include <cstdio>
+#include <dirent.h>
+#include <string>
+#include <sys/stat.h>
+#include <vector>
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
+
+namespace {
+
+bool runFile(const std::string& path)
+{
+    FILE* f = std::fopen(path.c_str(), "rb");
+    if (f == nullptr) {
+        std::perror(path.c_str());
+        return false;
+    }
+    std::vector<uint8_t> bytes;
+    uint8_t buf[4096];
+    size_t n;
+    while ((n = std::fread(buf, 1, sizeof buf, f)) > 0) {
+        bytes.insert(bytes.end(), buf, buf + n);
+    }
+    std::fclose(f);
+    LLVMFuzzerTestOneInput(bytes.data(), bytes.size());
+    return true;
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    size_t runs = 0;
+    for (int i = 1; i < argc; ++i) {
+        struct stat st {};
+        if (stat(argv[i], &st) != 0) {
+            std::perror(argv[i]);
+            return 1;
+        }
+        if (!S_ISDIR(st.st_mode)) {
+            runs += runFile(argv[i]) ? 1 : 0;
+            continue;
+        }
+        DIR* dir = opendir(argv[i]);
+        while (dirent* e = readdir(dir)) {
+            if (e->d_name[0] == '.') {
+                continue;
+            }
+            if (!runFile(std::string(argv[i]) + "/" + e->d_name)) {
+                closedir(dir);
+                return 1;
+            }
+            ++runs;
+        }
+        closedir(dir);
+    }
+    std::printf("replayed %zu inputs\n", runs);
+    return runs > 0 ? 0 : 1;
+}

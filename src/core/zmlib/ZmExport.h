@@ -1,0 +1,15 @@
+/// \file
+/// The export macro of the library's interface.
+///
+/// The shared library is built with hidden visibility; `ZMLIB_API` marks the classes and functions
+/// that form its interface. A static build (`ZMLIB_STATIC`) needs no marking.
+#pragma once
+
+#if defined(ZMLIB_STATIC)
+#define ZMLIB_API
+#else
+#define ZMLIB_API __attribute__((visibility("default")))
+#endif
+
+/// printf-style format checking for the library's variadic formatters.
+#define ZMLIB_PRINTF(fmtIndex, firstArg) __attribute__((format(printf, fmtIndex, firstArg)))

@@ -1,0 +1,9 @@
+// The command families of zmtool. Each takes the arguments after its own name and returns the
+// process exit status.
+#pragma once
+
+namespace zmtool {
+
+int runDemo(int argc, char** argv);
+
+} // namespace zmtool
