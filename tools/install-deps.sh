@@ -5,7 +5,7 @@
 #   tools/install-deps.sh fuzz       ... plus clang and libFuzzer
 set -euo pipefail
 
-packages=(cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev)
+packages=(make cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev)
 for extra in "$@"; do
   case "$extra" in
     bench) packages+=(libbenchmark-dev) ;;
