@@ -217,7 +217,7 @@ public:
         destroyRange(pos, pos + n);
         const int64_t tail = m_size - pos - n;
         if (tail > 0) {
-            std::memmove(static_cast<void*>(m_data + pos), m_data + pos + n, sizeof(T) * size_t(tail));
+            relocate(m_data + pos, m_data + pos + n, tail);
         }
         m_size -= n;
     }
@@ -361,6 +361,12 @@ private:
             (void)to;
         }
     }
+    /// Moves \p n elements as raw bytes (ranges may overlap). Elements are bitwise relocatable
+    /// by contract, class types included, so no constructor or destructor runs.
+    static void relocate(T* dst, const T* src, int64_t n)
+    {
+        std::memmove(static_cast<void*>(dst), static_cast<const void*>(src), sizeof(T) * size_t(n));
+    }
     static void constructCopy(T* slot, const T& v)
     {
         if constexpr (std::is_trivially_copyable_v<T>) {
@@ -446,7 +452,7 @@ void ZmDArray<T>::insertMemory(int64_t pos, int64_t n)
         reallocate(m_max);
     }
     if (pos < m_size) {
-        std::memmove(static_cast<void*>(m_data + pos + n), m_data + pos, sizeof(T) * size_t(m_size - pos));
+        relocate(m_data + pos + n, m_data + pos, m_size - pos);
     }
     m_size = needed;
 }
@@ -492,8 +498,7 @@ int64_t ZmDArray<T>::removeValue(const T& v)
             destroyRange(i, i + 1);
         } else {
             if (kept != i) {
-                std::memcpy(static_cast<void*>(m_data + kept), static_cast<const void*>(m_data + i),
-                            sizeof(T));
+                relocate(m_data + kept, m_data + i, 1);
             }
             ++kept;
         }
@@ -592,14 +597,13 @@ void ZmDArray<T>::rotate(int64_t n)
     const int64_t k = n < 0 ? -n : n;
     const size_t kBytes = bytesFor(k);
     void* tmp = zmmalloc(kBytes);
-    const size_t restBytes = sizeof(T) * size_t(m_size - k);
     if (n < 0) {
         std::memcpy(tmp, static_cast<const void*>(m_data), kBytes);
-        std::memmove(static_cast<void*>(m_data), m_data + k, restBytes);
+        relocate(m_data, m_data + k, m_size - k);
         std::memcpy(static_cast<void*>(m_data + (m_size - k)), tmp, kBytes);
     } else {
         std::memcpy(tmp, static_cast<const void*>(m_data + (m_size - k)), kBytes);
-        std::memmove(static_cast<void*>(m_data + k), m_data, restBytes);
+        relocate(m_data + k, m_data, m_size - k);
         std::memcpy(static_cast<void*>(m_data), tmp, kBytes);
     }
     zmfree(tmp);

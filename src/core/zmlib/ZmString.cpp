@@ -332,6 +332,7 @@ char* ZmString::vprintf(const char* fmt, va_list args)
     }
     va_list first;
     va_copy(first, args);
+    // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): initialised by va_copy above
     const int len = std::vsnprintf(m_data, size_t(m_max), fmt, first);
     va_end(first);
     if (len < 0) {

@@ -35,6 +35,7 @@ public:
     ZmString(int, const char* fmt, ...) ZMLIB_PRINTF(3, 4);
     ZmString(const ZmString& other) : ZmDArray<char>(other) {}
     /// Copies: the source keeps its text.
+    // NOLINTNEXTLINE(performance-move-constructor-init,performance-noexcept-move-constructor)
     ZmString(ZmString&& other) : ZmDArray<char>(other) {}
     ~ZmString() = default;
 
@@ -44,6 +45,7 @@ public:
         return *this;
     }
     /// Copies: the source keeps its text.
+    // NOLINTNEXTLINE(performance-noexcept-move-constructor)
     ZmString& operator=(ZmString&& other)
     {
         ZmDArray<char>::operator=(static_cast<const ZmDArray<char>&>(other));
