@@ -154,12 +154,25 @@ public:
     /// Adds \p v at the end (it may be an element of this array); returns its index.
     int64_t append(const T& v)
     {
-        if (m_size < m_max) {
-            constructCopy(m_data + m_size, v);
-            return m_size++;
+        if constexpr (std::is_trivially_copyable_v<T>) {
+            // The value is copied before growing, so an element of this array is safe to append
+            // and the caller's variable need not live in memory across the call.
+            const T value = v;
+            if (m_size < m_max) {
+                ++m_size;
+            } else {
+                insertMemory(m_size, 1);
+            }
+            m_data[m_size - 1] = value;
+            return m_size - 1;
+        } else {
+            if (m_size < m_max) {
+                new (static_cast<void*>(m_data + m_size)) T(v);
+                return m_size++;
+            }
+            insert(m_size, 1, &v);
+            return m_size - 1;
         }
-        insert(m_size, 1, &v);
-        return m_size - 1;
     }
     int64_t push(const T& v) { return append(v); }
     void push_back(const T& v) { append(v); }
@@ -366,14 +379,6 @@ private:
     static void relocate(T* dst, const T* src, int64_t n)
     {
         std::memmove(static_cast<void*>(dst), static_cast<const void*>(src), sizeof(T) * size_t(n));
-    }
-    static void constructCopy(T* slot, const T& v)
-    {
-        if constexpr (std::is_trivially_copyable_v<T>) {
-            *slot = v;
-        } else {
-            new (static_cast<void*>(slot)) T(v);
-        }
     }
     static void copyAssign(T* dst, const T* src, int64_t n)
     {
@@ -595,6 +600,9 @@ template <class T>
 void ZmDArray<T>::rotate(int64_t n)
 {
     const int64_t k = n < 0 ? -n : n;
+    if (k == 0) {
+        return;
+    }
     const size_t kBytes = bytesFor(k);
     void* tmp = zmmalloc(kBytes);
     if (n < 0) {

@@ -118,10 +118,19 @@ public:
         m_size = 1;
         m_data[0] = 0;
     }
+    /// \p c takes the terminator's place and a new terminator follows.
     ZmString& operator+=(char c)
     {
-        m_data[m_size - 1] = c;
-        append('\0');
+        // Grow first, then write both bytes through one pointer: a failed growth leaves the text
+        // intact, and the size is not re-read between the two stores.
+        if (m_size < m_max) {
+            ++m_size;
+        } else {
+            insertMemory(m_size, 1);
+        }
+        char* end = m_data + m_size;
+        end[-2] = c;
+        end[-1] = 0;
         return *this;
     }
     /// Null does nothing.
