@@ -1,5 +1,7 @@
 // Runs a fuzz target over every file of the directories (or files) named on the command line, as
-// libFuzzer would run its corpus, for builds without libFuzzer.
+// libFuzzer would run its corpus, for builds without libFuzzer. Each file name is printed before
+// its run, so when a target stops the program the last name printed is the input that did it.
+#include <algorithm>
 #include <cstdint>
 #include <cstdio>
 #include <dirent.h>
@@ -25,7 +27,11 @@ bool runFile(const std::string& path)
         bytes.insert(bytes.end(), buf, buf + n);
     }
     std::fclose(f);
-    LLVMFuzzerTestOneInput(bytes.data(), bytes.size());
+    std::printf("replaying %s (%zu bytes)\n", path.c_str(), bytes.size());
+    std::fflush(stdout);
+    // libFuzzer never hands a target a null pointer, not even for an empty input.
+    static const uint8_t none = 0;
+    LLVMFuzzerTestOneInput(bytes.empty() ? &none : bytes.data(), bytes.size());
     return true;
 }
 
@@ -41,21 +47,32 @@ int main(int argc, char** argv)
             return 1;
         }
         if (!S_ISDIR(st.st_mode)) {
-            runs += runFile(argv[i]) ? 1 : 0;
+            if (!runFile(argv[i])) {
+                return 1;
+            }
+            ++runs;
             continue;
         }
         DIR* dir = opendir(argv[i]);
+        if (dir == nullptr) {
+            std::perror(argv[i]);
+            return 1;
+        }
+        std::vector<std::string> names;
         while (dirent* e = readdir(dir)) {
-            if (e->d_name[0] == '.') {
-                continue;
+            if (e->d_name[0] != '.') {
+                names.emplace_back(e->d_name);
             }
-            if (!runFile(std::string(argv[i]) + "/" + e->d_name)) {
-                closedir(dir);
+        }
+        closedir(dir);
+        // A fixed order, so that a failure reproduces the same way on every machine.
+        std::sort(names.begin(), names.end());
+        for (const std::string& name : names) {
+            if (!runFile(std::string(argv[i]) + "/" + name)) {
                 return 1;
             }
             ++runs;
         }
-        closedir(dir);
     }
     std::printf("replayed %zu inputs\n", runs);
     return runs > 0 ? 0 : 1;
