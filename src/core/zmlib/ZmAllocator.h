@@ -19,7 +19,7 @@ public:
     using FreeFn = void (*)(void*);
 
     /// Preset pairs.
-    enum AllocatorType {
+    enum AllocatorType : int {
         NoAllocator = 0,   ///< cannot allocate, never frees
         MallocFree = 1,    ///< runtime malloc / free
         CRuntime = 2,      ///< the same pair as MallocFree
