@@ -9,6 +9,7 @@
 // drained. Embedded zero bytes reach the tokenizer through the ZmString constructor, which takes
 // the string's length(); the const char* forms stop at the first zero byte.
 #include "FuzzCheck.h"
+#include "ModelTokenizer.h"
 
 #include <zmlib/ZmString.h>
 #include <zmlib/ZmStringTokenizer.h>
@@ -26,40 +27,6 @@ namespace {
 bool isDelimiter(char c)
 {
     return std::isspace(static_cast<unsigned char>(c)) != 0;
-}
-
-// The tokenizing rules read one byte at a time.
-std::vector<std::string> modelTokens(const char* text, size_t len)
-{
-    std::vector<std::string> tokens;
-    size_t pos = 0;
-    while (pos < len && isDelimiter(text[pos])) {
-        ++pos;
-    }
-    while (pos < len) {
-        std::string token;
-        while (pos < len && !isDelimiter(text[pos])) {
-            if (text[pos] == '\\') {
-                ++pos;
-                if (pos < len) {
-                    token += text[pos];
-                }
-            } else if (text[pos] == '"') {
-                ++pos;
-                while (pos < len && text[pos] != '"') {
-                    token += text[pos++];
-                }
-            } else {
-                token += text[pos];
-            }
-            ++pos;
-        }
-        while (pos < len && isDelimiter(text[pos])) {
-            ++pos;
-        }
-        tokens.push_back(token);
-    }
-    return tokens;
 }
 
 void drainAndCheck(ZmStringTokenizer& tokenizer, size_t len, const std::vector<std::string>& expected)
@@ -101,12 +68,12 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     const ZmString text(bytes, 0, int(size));
     FUZZ_CHECK(size_t(text.length()) == size);
     ZmStringTokenizer whole(text);
-    drainAndCheck(whole, size, modelTokens(text.getString(), size));
+    drainAndCheck(whole, size, modelTokens(text.getString(), size, isDelimiter));
 
     // The same bytes as a C string: up to the first zero byte.
     const char* cText = text.getString();
     const size_t cLen = std::strlen(cText);
-    const std::vector<std::string> cExpected = modelTokens(cText, cLen);
+    const std::vector<std::string> cExpected = modelTokens(cText, cLen, isDelimiter);
     ZmStringTokenizer fromChars(cText);
     drainAndCheck(fromChars, cLen, cExpected);
 

@@ -7,6 +7,7 @@
 // any input are checked as for the white-space tokenizer. A copy made in the middle of the text
 // must continue exactly like the original, and re-targeting keeps the delimiter set.
 #include "FuzzCheck.h"
+#include "ModelTokenizer.h"
 
 #include <zmlib/ZmString.h>
 #include <zmlib/ZmStringTokenizerGeneral.h>
@@ -26,40 +27,6 @@ using DelimiterSet = std::bitset<256>;
 bool isDelimiter(const DelimiterSet& set, char c)
 {
     return set[static_cast<unsigned char>(c)];
-}
-
-// The tokenizing rules read one byte at a time.
-std::vector<std::string> modelTokens(const char* text, size_t len, const DelimiterSet& set)
-{
-    std::vector<std::string> tokens;
-    size_t pos = 0;
-    while (pos < len && isDelimiter(set, text[pos])) {
-        ++pos;
-    }
-    while (pos < len) {
-        std::string token;
-        while (pos < len && !isDelimiter(set, text[pos])) {
-            if (text[pos] == '\\') {
-                ++pos;
-                if (pos < len) {
-                    token += text[pos];
-                }
-            } else if (text[pos] == '"') {
-                ++pos;
-                while (pos < len && text[pos] != '"') {
-                    token += text[pos++];
-                }
-            } else {
-                token += text[pos];
-            }
-            ++pos;
-        }
-        while (pos < len && isDelimiter(set, text[pos])) {
-            ++pos;
-        }
-        tokens.push_back(token);
-    }
-    return tokens;
 }
 
 bool sameToken(const ZmString& token, const std::string& expected)
@@ -121,7 +88,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     const size_t len = size - 1 - delimCount;
     const ZmString text(bytes, int(1 + delimCount), int(len));
     FUZZ_CHECK(size_t(text.length()) == len);
-    const std::vector<std::string> expected = modelTokens(text.getString(), len, set);
+    const std::vector<std::string> expected =
+        modelTokens(text.getString(), len, [&set](char c) { return isDelimiter(set, c); });
 
     // The whole text, zero bytes included; half-way through a copy is taken and both go on.
     ZmStringTokenizerGeneral whole(text, delims.c_str());
@@ -133,7 +101,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     // The same bytes as a C string: up to the first zero byte.
     const char* cText = text.getString();
     const size_t cLen = std::strlen(cText);
-    const std::vector<std::string> cExpected = modelTokens(cText, cLen, set);
+    const std::vector<std::string> cExpected =
+        modelTokens(cText, cLen, [&set](char c) { return isDelimiter(set, c); });
     ZmStringTokenizerGeneral fromChars(cText, delims.c_str());
     drainAndCheck(fromChars, cLen, cExpected, 0);
 

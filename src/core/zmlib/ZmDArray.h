@@ -393,6 +393,8 @@ private:
         }
     }
     void insertSlow(int64_t pos, int64_t n, const T* src);
+    /// Narrows the exclusive bounds (lo, hi) around the place of \p v (hi -1 = the size).
+    void bisect(const T& v, CompareFn compare, int64_t& lo, int64_t& hi) const;
 };
 
 template <class T>
@@ -526,7 +528,7 @@ void ZmDArray<T>::subtract(const ZmDArray& other)
 }
 
 template <class T>
-int64_t ZmDArray<T>::findSorted(const T& v, CompareFn compare, int64_t lo, int64_t hi) const
+void ZmDArray<T>::bisect(const T& v, CompareFn compare, int64_t& lo, int64_t& hi) const
 {
     if (hi == -1) {
         hi = m_size;
@@ -536,9 +538,15 @@ int64_t ZmDArray<T>::findSorted(const T& v, CompareFn compare, int64_t lo, int64
         if (compare(v, m_data[mid]) < 0) {
             hi = mid;
         } else {
-            lo = mid;
+            lo = mid; // ties move lo up: equal elements stay before v
         }
     }
+}
+
+template <class T>
+int64_t ZmDArray<T>::findSorted(const T& v, CompareFn compare, int64_t lo, int64_t hi) const
+{
+    bisect(v, compare, lo, hi);
     if (lo >= 0 && compare(v, m_data[lo]) == 0) {
         return lo;
     }
@@ -551,17 +559,7 @@ int64_t ZmDArray<T>::findSorted(const T& v, CompareFn compare, int64_t lo, int64
 template <class T>
 int64_t ZmDArray<T>::insertSorted(const T& v, CompareFn compare, int64_t lo, int64_t hi)
 {
-    if (hi == -1) {
-        hi = m_size;
-    }
-    while (hi - lo > 1) {
-        const int64_t mid = (lo + hi) / 2;
-        if (compare(v, m_data[mid]) < 0) {
-            hi = mid;
-        } else {
-            lo = mid;
-        }
-    }
+    bisect(v, compare, lo, hi);
     insert(lo + 1, 1, &v);
     return lo + 1;
 }
