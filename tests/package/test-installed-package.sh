@@ -19,6 +19,12 @@ if [ -n "$bad" ]; then
   exit 1
 fi
 [ -f "$prefix/include/zmlib/zmlib.h" ] || { echo "umbrella header not installed" >&2; exit 1; }
+for h in "$prefix"/include/zmlib/*.h; do
+  name=$(basename "$h")
+  [ "$name" = zmlib.h ] && continue
+  grep -q "#include <zmlib/$name>" "$prefix/include/zmlib/zmlib.h" ||
+    { echo "zmlib.h does not include $name" >&2; exit 1; }
+done
 
 expected='zmlib [0-9.]+: 5 fields, 2 match scan_\*: scan_001.dcm scan_002.raw'
 

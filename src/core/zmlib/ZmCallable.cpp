@@ -1,0 +1,4 @@
+#include <zmlib/ZmCallable.h>
+
+// Anchors the virtual table in the library.
+ZmCallable::~ZmCallable() = default;
