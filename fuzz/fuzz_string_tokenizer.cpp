@@ -34,18 +34,7 @@ void drainAndCheck(ZmStringTokenizer& tokenizer, size_t len, const std::vector<s
     size_t count = 0;
     size_t bytes = 0;
     while (tokenizer.hasMoreTokens()) {
-        // Each token uses up at least one byte, so more than len tokens means a runaway.
-        FUZZ_CHECK(count < len);
-        const ZmString& token = tokenizer.nextToken();
-        const size_t tokenLen = size_t(token.length());
-        FUZZ_CHECK(token.length() >= 0 && tokenLen <= len);
-        FUZZ_CHECK(token.getString()[tokenLen] == 0);
-        bytes += tokenLen;
-        FUZZ_CHECK(bytes <= len);
-        FUZZ_CHECK(count < expected.size());
-        FUZZ_CHECK(tokenLen == expected[count].size());
-        FUZZ_CHECK(std::memcmp(token.getString(), expected[count].data(), tokenLen) == 0);
-        ++count;
+        checkNextToken(tokenizer, len, expected, count, bytes);
     }
     FUZZ_CHECK(count == expected.size());
     FUZZ_CHECK(!tokenizer.hasMoreTokens());

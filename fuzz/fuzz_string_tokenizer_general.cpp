@@ -29,12 +29,6 @@ bool isDelimiter(const DelimiterSet& set, char c)
     return set[static_cast<unsigned char>(c)];
 }
 
-bool sameToken(const ZmString& token, const std::string& expected)
-{
-    return size_t(token.length()) == expected.size() &&
-           std::memcmp(token.getString(), expected.data(), expected.size()) == 0;
-}
-
 // Takes up to maxTokens tokens (all when negative), checking them against expected from index
 // first on; returns the index of the next expected token.
 size_t takeAndCheck(ZmStringTokenizerGeneral& tokenizer, size_t len, const std::vector<std::string>& expected,
@@ -43,17 +37,7 @@ size_t takeAndCheck(ZmStringTokenizerGeneral& tokenizer, size_t len, const std::
     size_t count = first;
     size_t bytes = 0;
     for (long taken = 0; tokenizer.hasMoreTokens() && (maxTokens < 0 || taken < maxTokens); ++taken) {
-        // Each token uses up at least one byte, so more than len tokens means a runaway.
-        FUZZ_CHECK(count < len);
-        const ZmString& token = tokenizer.nextToken();
-        const size_t tokenLen = size_t(token.length());
-        FUZZ_CHECK(token.length() >= 0 && tokenLen <= len);
-        FUZZ_CHECK(token.getString()[tokenLen] == 0);
-        bytes += tokenLen;
-        FUZZ_CHECK(bytes <= len);
-        FUZZ_CHECK(count < expected.size());
-        FUZZ_CHECK(sameToken(token, expected[count]));
-        ++count;
+        checkNextToken(tokenizer, len, expected, count, bytes);
     }
     return count;
 }

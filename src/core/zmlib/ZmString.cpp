@@ -23,6 +23,17 @@ bool isAsciiAlpha(char c)
 
 } // namespace
 
+template <class Pred>
+bool ZmString::allBytes(Pred pred) const
+{
+    for (int i = 0; i < length(); ++i) {
+        if (!pred(m_data[i])) {
+            return false;
+        }
+    }
+    return true;
+}
+
 ZmString::ZmString(const char* s) : ZmDArray<char>(0, 16)
 {
     if (s == nullptr) {
@@ -67,32 +78,17 @@ ZmString& ZmString::operator=(const char* s)
 
 bool ZmString::isAlnum() const
 {
-    for (int i = 0; i < length(); ++i) {
-        if (!isAsciiAlpha(m_data[i]) && !isAsciiDigit(m_data[i])) {
-            return false;
-        }
-    }
-    return true;
+    return allBytes([](char c) { return isAsciiAlpha(c) || isAsciiDigit(c); });
 }
 
 bool ZmString::isAlpha() const
 {
-    for (int i = 0; i < length(); ++i) {
-        if (!isAsciiAlpha(m_data[i])) {
-            return false;
-        }
-    }
-    return true;
+    return allBytes(isAsciiAlpha);
 }
 
 bool ZmString::isDigit() const
 {
-    for (int i = 0; i < length(); ++i) {
-        if (!isAsciiDigit(m_data[i])) {
-            return false;
-        }
-    }
-    return true;
+    return allBytes(isAsciiDigit);
 }
 
 bool ZmString::operator!=(const char* s) const

@@ -188,4 +188,7 @@ public:
 private:
     /// Drops the terminator before appending.
     void remove0() { --m_size; }
+    /// \p pred holds for every byte of the text (true for the empty text).
+    template <class Pred>
+    bool allBytes(Pred pred) const;
 };
