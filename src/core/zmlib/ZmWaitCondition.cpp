@@ -1,0 +1,90 @@
+#include <zmlib/ZmLogFile.h>
+#include <zmlib/ZmMutex.h>
+#include <zmlib/ZmMutex_p.h>
+#include <zmlib/ZmWaitCondition.h>
+#include <zmlib/ZmWaitCondition_p.h>
+
+#include <atomic>
+#include <pthread.h>
+
+struct ZmWaitConditionPrivate {
+    pthread_cond_t cond;
+    std::atomic<int> refs{1};
+};
+
+namespace {
+
+void release(ZmWaitConditionPrivate* d)
+{
+    if (d->refs.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+        const int rc = pthread_cond_destroy(&d->cond);
+        if (rc != 0) {
+            getTheLogInstance().errorf("ZmWaitCondition::~ZmWaitCondition() failed (error code: %d)\n", rc);
+        }
+        delete d;
+    }
+}
+
+} // namespace
+
+ZmWaitCondition::ZmWaitCondition() : m_d(new ZmWaitConditionPrivate)
+{
+    // Default attributes: the condition measures deadlines on the wall clock.
+    const int rc = pthread_cond_init(&m_d->cond, nullptr);
+    if (rc != 0) {
+        getTheLogInstance().errorf("ZmWaitCondition::ZmWaitCondition() failed (error code: %d)\n", rc);
+    }
+}
+
+// Copies share the condition on purpose: the copy and the source are the same condition.
+ZmWaitCondition::ZmWaitCondition(const ZmWaitCondition& other) : m_d(other.m_d)
+{
+    m_d->refs.fetch_add(1, std::memory_order_relaxed);
+}
+
+ZmWaitCondition& ZmWaitCondition::operator=(const ZmWaitCondition& other)
+{
+    other.m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    release(m_d);
+    m_d = other.m_d;
+    return *this;
+}
+
+ZmWaitCondition::~ZmWaitCondition()
+{
+    release(m_d);
+}
+
+bool ZmWaitCondition::wait(ZmMutex* mutex, unsigned long ms)
+{
+    pthread_mutex_t* m = &mutex->privatePart()->mutex;
+    if (ms >= 4294967295UL) {
+        const int rc = pthread_cond_wait(&m_d->cond, m);
+        if (rc != 0) {
+            getTheLogInstance().errorf("ZmWaitCondition::wait() failed (error code: %d)\n", rc);
+            return false;
+        }
+        return true;
+    }
+    timespec now;
+    clock_gettime(CLOCK_REALTIME, &now);
+    const timespec deadline = zmWaitConditionDeadline(now, ms);
+    // Time-outs and errors alike answer false without a log line: a time-out is the normal outcome.
+    return pthread_cond_timedwait(&m_d->cond, m, &deadline) == 0;
+}
+
+void ZmWaitCondition::wakeOne()
+{
+    const int rc = pthread_cond_signal(&m_d->cond);
+    if (rc != 0) {
+        getTheLogInstance().errorf("ZmWaitCondition::wakeOne() failed (error code: %d)\n", rc);
+    }
+}
+
+void ZmWaitCondition::wakeAll()
+{
+    const int rc = pthread_cond_broadcast(&m_d->cond);
+    if (rc != 0) {
+        getTheLogInstance().errorf("ZmWaitCondition::wakeAll() failed (error code: %d)\n", rc);
+    }
+}

@@ -1,0 +1,361 @@
+#include "LogCapture.h"
+#include "ScratchDir.h"
+
+#include <zmlib/ZmLogFile.h>
+
+#include <gtest/gtest.h>
+
+#include <dirent.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <atomic>
+#include <cctype>
+#include <cstdio>
+#include <ctime>
+#include <fstream>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace {
+
+// True when \p text has the shape of \p pattern, where '#' stands for one digit and every other
+// character for itself. (std::regex would do, but trips GCC's uninitialised-use warning at -O1.)
+bool hasShape(const std::string& text, const std::string& pattern)
+{
+    if (text.size() != pattern.size()) {
+        return false;
+    }
+    for (size_t i = 0; i < text.size(); ++i) {
+        if (pattern[i] == '#' ? !std::isdigit(static_cast<unsigned char>(text[i])) : text[i] != pattern[i]) {
+            return false;
+        }
+    }
+    return true;
+}
+
+// The log is process-wide: every test leaves its settings as it found them.
+class ZmLogFileTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        ZmLogFile& log = getTheLogInstance();
+        m_folder = log.baseFolder();
+        m_count = log.maxNumLogFiles();
+        m_size = log.maxLogFileSizeInBytes();
+        m_format = log.dateTimeFormat();
+        m_module = log.defaultModule();
+    }
+    void TearDown() override
+    {
+        ZmLogFile& log = getTheLogInstance();
+        log.close();
+        log.setBaseFolder(m_folder);
+        log.setMaxNumLogFiles(m_count);
+        log.setMaxLogFileSizeInBytes(m_size);
+        log.setDateTimeFormat(m_format);
+        log.setDefaultModule(m_module.c_str());
+    }
+
+    static std::vector<std::string> logFiles(const std::string& dir)
+    {
+        std::vector<std::string> names;
+        if (DIR* d = opendir(dir.c_str())) {
+            while (dirent* e = readdir(d)) {
+                const std::string name = e->d_name;
+                if (name.size() > 4 && name.compare(name.size() - 4, 4, ".log") == 0) {
+                    names.push_back(name);
+                }
+            }
+            closedir(d);
+        }
+        std::sort(names.begin(), names.end());
+        return names;
+    }
+    static std::vector<std::string> readLines(const std::string& path)
+    {
+        std::ifstream in(path);
+        std::vector<std::string> lines;
+        for (std::string line; std::getline(in, line);) {
+            lines.push_back(line);
+        }
+        return lines;
+    }
+    // Runs \p body in a forked child (for what cannot be undone in this process) and returns its
+    // exit status.
+    template <class F>
+    static int inChild(F body)
+    {
+        std::fflush(nullptr);
+        const pid_t pid = fork();
+        if (pid == 0) {
+            const int status = body();
+            std::fflush(nullptr);
+            _exit(status);
+        }
+        int status = -1;
+        waitpid(pid, &status, 0);
+        return WIFEXITED(status) ? WEXITSTATUS(status) : 100 + WTERMSIG(status);
+    }
+
+    std::string m_folder;
+    int64_t m_count = 0;
+    uint64_t m_size = 0;
+    ZmLogFile::DateTimeFormat m_format = ZmLogFile::TimeOfDay;
+    std::string m_module;
+};
+
+TEST(ZmLogLevel, TextForms)
+{
+    const char* expected[] = {"D", "I", "W", "E", "C", ""};
+    for (int level = 0; level <= 5; ++level) {
+        EXPECT_STREQ(ZmLogLevelToString(ZmLogLevel(level)), expected[level]);
+    }
+    bool ok = false;
+    EXPECT_EQ(ZmLogLevelFromString("warning", &ok), ZmLogWarning);
+    EXPECT_TRUE(ok);
+    EXPECT_EQ(ZmLogLevelFromString("Debug", &ok), ZmLogDebug);
+    EXPECT_EQ(ZmLogLevelFromString("I", nullptr), ZmLogInfo);
+    EXPECT_EQ(ZmLogLevelFromString("x", &ok), ZmLogCritical);
+    EXPECT_FALSE(ok);
+    ok = true;
+    EXPECT_EQ(ZmLogLevelFromString("error", &ok), ZmLogError);
+    EXPECT_EQ(ZmLogLevelFromString(nullptr, &ok), ZmLogCritical);
+    EXPECT_FALSE(ok);
+}
+
+TEST_F(ZmLogFileTest, LineLayoutPerFormatAndLevel)
+{
+    ZmLogFile& log = getTheLogInstance();
+    LogCapture capture(ZmLogInfo);
+    log.trace(ZmLogDebug, "Mod", "dropped");
+    char before[16];
+    const time_t t0 = time(nullptr);
+    strftime(before, sizeof before, "%H:%M:%S", localtime(&t0));
+    log.trace(ZmLogInfo, "Mod", "text");
+    char after[16];
+    const time_t t1 = time(nullptr);
+    strftime(after, sizeof after, "%H:%M:%S", localtime(&t1));
+    ASSERT_EQ(LogCapture::lines().size(), 1u);
+    const std::string line = LogCapture::lines()[0];
+    ASSERT_TRUE(hasShape(line, "1|##:##:##.###:   [Mod] text\n")) << line;
+    EXPECT_GE(line.substr(2, 8), before);
+    EXPECT_LE(line.substr(2, 8), after);
+
+    log.setDateTimeFormat(ZmLogFile::DateAndTime);
+    log.setDefaultModule("Default");
+    log.tracef(ZmLogCritical, nullptr, "%d-%s", 7, "x");
+    EXPECT_TRUE(hasShape(LogCapture::lines()[1], "4|####-##-## ##:##:##.###: C [Default] 7-x\n"))
+        << LogCapture::lines()[1];
+    log.setDateTimeFormat(ZmLogFile::NoDateTime);
+    log.warn("", "w");
+    log.errorf("e%d", 1);
+    log.writeLine(ZmLogInfo, "already ends\n");
+    log.print("P", "plain");
+    log.printf("n=%d", 3);
+    {
+        ZmLogFileDefaultModuleModifier scoped("Scoped");
+        log.trace(ZmLogWarning, nullptr, nullptr);
+    }
+    log.trace(ZmLogWarning, nullptr, "back");
+    const std::vector<std::string> expected = {
+        "2|W [Default] w\n", "3|E [Default] e1\n", "1|already ends\n",    "1|[P] plain\n",
+        "1|n=3\n",           "2|W [Scoped] \n",    "2|W [Default] back\n"};
+    EXPECT_EQ(std::vector<std::string>(LogCapture::lines().begin() + 2, LogCapture::lines().end()), expected);
+}
+
+TEST_F(ZmLogFileTest, CallbackLevelAndDisablers)
+{
+    ZmLogFile& log = getTheLogInstance();
+    LogCapture capture(ZmLogDebug);
+    log.setWriteCallback(log.writeCallback(), ZmLogWarning);
+    EXPECT_TRUE(log.debugEnabled()) << "the log level is still debug";
+    ZmString sink;
+    {
+        ZmLogFileScopedWriteCallbackDisabler off;
+        EXPECT_EQ(log.writeCallback(), nullptr);
+        log.trace(ZmLogError, "M", "unseen");
+    }
+    ZmLogFileWriteCallbackDisabler disabler;
+    disabler.restoreWriteCallback(); // nothing taken yet: a no-op
+    ASSERT_NE(log.writeCallback(), nullptr);
+    log.trace(ZmLogInfo, "M", "below the callback level");
+    log.trace(ZmLogWarning, "M", "seen");
+    disabler.disableWriteCallback();
+    disabler.disableWriteCallback();
+    log.trace(ZmLogError, "M", "unseen");
+    disabler.restoreWriteCallback();
+    EXPECT_EQ(log.writeCallbackLogLevel(), ZmLogWarning);
+    ASSERT_EQ(LogCapture::lines().size(), 1u);
+    EXPECT_NE(LogCapture::lines()[0].find("W [M] seen"), std::string::npos);
+}
+
+TEST_F(ZmLogFileTest, EightThreadsThroughRotationLoseNothingAndCleanUpKeepsTheCount)
+{
+    ScratchDir dir;
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir.path());
+    log.setMaxNumLogFiles(0);
+    log.setMaxLogFileSizeInBytes(32 * 1024);
+    ASSERT_TRUE(log.open(true));
+    EXPECT_FALSE(log.open(false)) << "already open";
+    constexpr int kThreads = 8;
+    constexpr int kLines = 20000;
+    std::vector<std::thread> threads;
+    for (int t = 0; t < kThreads; ++t) {
+        threads.emplace_back([t, &log] {
+            for (int i = 0; i < kLines; ++i) {
+                log.tracef(ZmLogInfo, "T", "t%d n%d", t, i);
+            }
+        });
+    }
+    for (std::thread& t : threads) {
+        t.join();
+    }
+    log.close();
+
+    const std::vector<std::string> files = logFiles(dir.path());
+    ASSERT_GT(files.size(), 50u) << "rotation must have happened many times";
+    std::vector<int> next(kThreads, 0);
+    for (size_t k = 0; k < files.size(); ++k) {
+        const std::vector<std::string> lines = readLines(dir / files[k]);
+        ASSERT_FALSE(lines.empty());
+        size_t first = 0;
+        if (k > 0) {
+            EXPECT_EQ(lines[0], "This file continues " + (dir / files[k - 1])) << files[k];
+            first = 1;
+        }
+        for (size_t i = first; i < lines.size(); ++i) {
+            // "HH:MM:SS.mmm:   [T] t<thread> n<number>", whole
+            const std::string& line = lines[i];
+            ASSERT_TRUE(line.size() > 24 && hasShape(line.substr(0, 24), "##:##:##.###:   [T] t# n"))
+                << files[k] << ": " << line;
+            const int t = line[21] - '0';
+            ASSERT_LT(t, kThreads);
+            ASSERT_EQ(line.substr(24), std::to_string(next[t])) << "thread " << t << " in " << files[k];
+            ++next[t];
+        }
+    }
+    EXPECT_EQ(next, std::vector<int>(kThreads, kLines));
+
+    log.setMaxNumLogFiles(5);
+    ASSERT_TRUE(log.open(true));
+    log.close();
+    const std::vector<std::string> kept = logFiles(dir.path());
+    ASSERT_EQ(kept.size(), 5u);
+    EXPECT_EQ(kept[3], files.back()) << "the newest files stay";
+}
+
+TEST_F(ZmLogFileTest, OpenPrunesTheOldestFilesAndTheirDumps)
+{
+    ScratchDir dir;
+    for (const char* name :
+         {"20000101-000000-1000001.log", "20000101-000000-1000002.log", "20000101-000000-1000001.dmp",
+          "20000102-000000-1000001.log", "20000102-000000-1000001.dmp", "20000103-000000-1000001.log",
+          "20000104-000000-1000001.log", "20000104-000000-1000001.dmp", "other.txt"}) {
+        std::ofstream(dir / name) << "x";
+    }
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir.path());
+    log.setMaxNumLogFiles(3);
+    ASSERT_TRUE(log.open(true));
+    const std::string opened = log.filePath().getString();
+    log.close();
+    const std::vector<std::string> left = logFiles(dir.path());
+    ASSERT_EQ(left.size(), 3u);
+    EXPECT_EQ(left[0], "20000103-000000-1000001.log");
+    EXPECT_EQ(left[1], "20000104-000000-1000001.log");
+    EXPECT_EQ(dir / left[2], opened);
+    EXPECT_NE(access((dir / "20000104-000000-1000001.dmp").c_str(), F_OK), -1);
+    EXPECT_EQ(access((dir / "20000101-000000-1000001.dmp").c_str(), F_OK), -1);
+    EXPECT_EQ(access((dir / "20000102-000000-1000001.dmp").c_str(), F_OK), -1);
+    EXPECT_NE(access((dir / "other.txt").c_str(), F_OK), -1);
+}
+
+TEST_F(ZmLogFileTest, UnwritableFolderKeepsOutputOnStandardOutput)
+{
+    ScratchDir dir;
+    std::ofstream(dir / "file") << "x";
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir / "file/sub"); // below a regular file: not even root can make it
+    log.close();
+    EXPECT_FALSE(log.open(true));
+    EXPECT_FALSE(log.isOpen());
+    testing::internal::CaptureStdout();
+    log.trace(ZmLogWarning, "M", "still here");
+    log.flush();
+    EXPECT_NE(testing::internal::GetCapturedStdout().find("W [M] still here\n"), std::string::npos);
+}
+
+TEST_F(ZmLogFileTest, RemovingTheFolderWhileLoggingCrashesNothing)
+{
+    ScratchDir dir;
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir.path());
+    log.setMaxLogFileSizeInBytes(4096);
+    ASSERT_TRUE(log.open(true));
+    std::atomic<bool> done{false};
+    std::thread remover([&] {
+        while (!done) {
+            ScratchDir::removeTree(dir.path());
+            std::this_thread::yield();
+        }
+    });
+    std::vector<std::thread> writers;
+    for (int t = 0; t < 4; ++t) {
+        writers.emplace_back([&log] {
+            for (int i = 0; i < 5000; ++i) {
+                log.tracef(ZmLogInfo, "R", "line %d", i);
+            }
+        });
+    }
+    for (std::thread& t : writers) {
+        t.join();
+    }
+    done = true;
+    remover.join();
+    ASSERT_TRUE(log.open(true)) << "the folder is made again";
+    log.trace(ZmLogInfo, "R", "after");
+    log.close();
+    const std::vector<std::string> files = logFiles(dir.path());
+    ASSERT_FALSE(files.empty());
+    const std::vector<std::string> lines = readLines(dir / files.back());
+    ASSERT_FALSE(lines.empty());
+    EXPECT_NE(lines.back().find("[R] after"), std::string::npos);
+}
+
+TEST_F(ZmLogFileTest, ConsoleRedirectionAndRelativeStampsInAChild)
+{
+    ScratchDir dir;
+    const int status = inChild([&] {
+        ZmLogFile& log = getTheLogInstance();
+        log.setBaseFolder(dir.path());
+        log.setConsoleToLogEnabled(true);
+        if (!log.open(true)) {
+            return 1;
+        }
+        std::printf("from printf\n");
+        std::fflush(stdout); // stderr is unbuffered and shares the descriptor's offset
+        std::fprintf(stderr, "from stderr\n");
+        log.print(nullptr, "via log");
+        log.resetTimeStamp();
+        ZmString stamp;
+        log.timeString(stamp, ZmLogFile::TimeOfDay);
+        log.print(nullptr, stamp.getString());
+        log.flush();
+        return 0;
+    });
+    ASSERT_EQ(status, 0);
+    const std::vector<std::string> files = logFiles(dir.path());
+    ASSERT_EQ(files.size(), 1u);
+    const std::vector<std::string> lines = readLines(dir / files[0]);
+    ASSERT_EQ(lines.size(), 4u);
+    EXPECT_EQ(lines[0], "from printf");
+    EXPECT_EQ(lines[1], "from stderr");
+    EXPECT_EQ(lines[2], "via log");
+    EXPECT_TRUE(hasShape(lines[3], "00:00:0#.###")) << lines[3];
+}
+
+} // namespace
