@@ -6,6 +6,7 @@
 #include <zmlib/zmlib.h>
 
 #include <cstdio>
+#include <string>
 
 namespace {
 
@@ -89,6 +90,73 @@ bool demoStrings()
     return same;
 }
 
+// A worker job: splits the header line and sums its field lengths, reporting to the log.
+class FieldCounter : public ZmWorkerThread {
+public:
+    FieldCounter() : ZmWorkerThread("zmtool demo worker") {}
+    ~FieldCounter() override { terminate(); }
+    int fields = 0;
+    int64_t characters = 0;
+
+protected:
+    void compute() override
+    {
+        ZmStringTokenizer tokens(kHeaderLine);
+        while (tokens.hasMoreTokens()) {
+            characters += tokens.nextToken().length();
+            ++fields;
+        }
+        getTheLogInstance().tracef(ZmLogInfo, "demo", "worker thread %lu: %d fields, %lld characters",
+                                   kvCurrentThreadId(), fields, static_cast<long long>(characters));
+    }
+};
+
+bool demoCore()
+{
+    heading("results: an error record and the thread's last error");
+    const ZmResult missing = KV_ERROR(ZmResult::ReadFileFailed, "sample.raw");
+    std::printf("  code %d, text \"%s\"\n", missing.codeValue(), missing.text());
+    Kv::fail(missing);
+    const bool kept = Kv::lastError(false).error() == missing.error();
+    std::printf("  written to the log; last error of this thread %s\n", kept ? "kept" : "LOST");
+
+    heading("threads: a worker thread runs a job");
+    FieldCounter worker;
+    const bool started = worker.start(true);
+    // The same count on this thread, for comparison.
+    int fields = 0;
+    for (ZmStringTokenizer tokens(kHeaderLine); tokens.hasMoreTokens(); tokens.nextToken()) {
+        ++fields;
+    }
+    worker.terminate();
+    const bool counted = started && worker.fields == fields && worker.jobsCompleted() == 1;
+    std::printf("  worker \"%s\" counted %d fields (%lld characters): %s\n", worker.name().getString(),
+                worker.fields, static_cast<long long>(worker.characters), counted ? "ok" : "FAILED");
+
+    heading("files: a temporary directory");
+    ZmString made;
+    bool removed = false;
+    {
+        ZmTmpDir dir("zmtool-demo", true, true);
+        made = dir;
+        for (const char* name : {"IM_0001.dcm", "IM_0002.dcm", "scan_01.raw"}) {
+            ZmFilename file(dir);
+            file.appendFile(name);
+            file.create(0644);
+        }
+        ZmDArray<ZmString> names;
+        ZmDirectory::scanSortedByName(dir.str(), names, "*.dcm", false);
+        std::printf("  made %s with 3 files; *.dcm:", dir.str());
+        for (const ZmString& name : names) {
+            std::printf(" %s", name.getString());
+        }
+        std::printf("\n");
+    }
+    removed = !ZmFilename(made).doesExist();
+    std::printf("  removed with its contents: %s\n", removed ? "yes" : "NO");
+    return kept && counted && removed;
+}
+
 } // namespace
 
 int zmtool::runDemo(int argc, char** argv)
@@ -99,8 +167,24 @@ int zmtool::runDemo(int argc, char** argv)
         return 2;
     }
     std::printf("zmlib %s demo\n", ZMLIB_VERSION_STRING);
+    // zmtool's log has a folder of its own: clean-up prunes the oldest *.log files of its folder,
+    // and those in the shared temporary folder are not all ours.
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(std::string(ZmTmpDir::getSystemTmpPath()) + "zmtool-logs");
+    log.setDefaultModule("zmtool");
+    const bool logOpen = log.open(false);
+    log.tracef(ZmLogInfo, "demo", "zmlib %s demo started", ZMLIB_VERSION_STRING);
     bool ok = true;
     ok = demoStrings() && ok;
+    ok = demoCore() && ok;
+    log.tracef(ZmLogInfo, "demo", "demo %s", ok ? "finished" : "FAILED");
+    log.flush();
     std::printf("\ndemo %s\n", ok ? "finished" : "FAILED");
+    if (logOpen) {
+        std::printf("log file: %s\n", log.filePath().getString());
+    } else {
+        std::printf("log file: none (could not open one in %s); the log went to standard output\n",
+                    log.baseFolder().c_str());
+    }
     return ok ? 0 : 1;
 }
