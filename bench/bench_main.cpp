@@ -154,6 +154,10 @@ private:
         if (!run.run_name.args.empty()) {
             name += "/" + run.run_name.args;
         }
+        // Runs of one benchmark with different thread counts are different cases.
+        if (!run.run_name.threads.empty()) {
+            name += "/" + run.run_name.threads;
+        }
         auto it = measures.find(name);
         if (it == measures.end()) {
             it = measures.emplace(name, Measure{}).first;
