@@ -151,7 +151,7 @@ TEST_F(ZmLogFileTest, LineLayoutPerFormatAndLevel)
         << LogCapture::lines()[1];
     log.setDateTimeFormat(ZmLogFile::NoDateTime);
     log.warn("", "w");
-    log.errorf("e%d", 1);
+    log.errorf("e%d\n", 1); // its own line feed: no second one
     log.writeLine(ZmLogInfo, "already ends\n");
     log.print("P", "plain");
     log.printf("n=%d", 3);
@@ -246,6 +246,49 @@ TEST_F(ZmLogFileTest, EightThreadsThroughRotationLoseNothingAndCleanUpKeepsTheCo
     const std::vector<std::string> kept = logFiles(dir.path());
     ASSERT_EQ(kept.size(), 5u);
     EXPECT_EQ(kept[3], files.back()) << "the newest files stay";
+}
+
+TEST_F(ZmLogFileTest, TheFirstLineBeyondTheSizeLimitStartsTheNextFile)
+{
+    ScratchDir dir;
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir.path());
+    log.setMaxLogFileSizeInBytes(100);
+    log.setDateTimeFormat(ZmLogFile::NoDateTime);
+    ASSERT_TRUE(log.open(true));
+    const std::string first = log.filePath().getString();
+    for (int i = 1; i <= 5; ++i) {
+        log.tracef(ZmLogInfo, "M", "line %d of thirty bytes.", i); // "  [M] " + 23 + "\n" = 30 bytes
+    }
+    log.close();
+    const std::vector<std::string> files = logFiles(dir.path());
+    ASSERT_EQ(files.size(), 2u);
+    EXPECT_EQ(dir / files[0], first);
+    EXPECT_EQ(readLines(dir / files[0]).size(), 4u) << "120 bytes: only then is the limit exceeded";
+    const std::vector<std::string> second = readLines(dir / files[1]);
+    ASSERT_EQ(second.size(), 2u);
+    EXPECT_EQ(second[0], "This file continues " + first);
+    EXPECT_EQ(second[1], "  [M] line 5 of thirty bytes.");
+}
+
+TEST_F(ZmLogFileTest, DateFoldersHoldTheFilesAndAreNeverPruned)
+{
+    ScratchDir dir;
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir.path());
+    log.setDateFoldersEnabled(true);
+    log.setMaxNumLogFiles(1);
+    ASSERT_TRUE(log.open(true));
+    ASSERT_TRUE(log.open(true));
+    const std::string path = log.filePath().getString();
+    log.close();
+    log.setDateFoldersEnabled(false);
+    char today[16];
+    const time_t now = time(nullptr);
+    strftime(today, sizeof today, "%Y%m%d", localtime(&now));
+    const std::string folder = path.substr(0, path.rfind('/'));
+    EXPECT_TRUE(folder == dir / today || folder < dir / today) << folder << " (midnight may have passed)";
+    EXPECT_EQ(logFiles(folder).size(), 2u) << "no clean-up with date folders";
 }
 
 TEST_F(ZmLogFileTest, OpenPrunesTheOldestFilesAndTheirDumps)

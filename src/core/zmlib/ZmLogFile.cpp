@@ -379,7 +379,7 @@ private:
     size_t m_length = 0;
 };
 
-// One tagged line: stamp and tag, the message, a line feed.
+// One tagged line: stamp and tag, the message, its line feed.
 void traceText(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const char* module, const char* text,
                size_t length)
 {
@@ -387,7 +387,10 @@ void traceText(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const char
     LineBuffer buffer(d);
     beginLine(d, buffer.line(), level, module);
     appendText(buffer.line(), text, length);
-    appendText(buffer.line(), "\n", 1);
+    // Many messages end in their own line feed; a line gets exactly one.
+    if (length == 0 || text[length - 1] != '\n') {
+        appendText(buffer.line(), "\n", 1);
+    }
     writeLineLocked(log, d, level, buffer.line());
 }
 
