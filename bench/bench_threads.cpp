@@ -19,32 +19,28 @@ ZMBENCH_TARGET("ZmMutex_lockUnlock", 1.1,
                "thread. Both are the same POSIX mutex underneath; the library adds its out-of-line call "
                "and the check of the unlock result.");
 
+template <class Mutex>
+void LockUnlock(benchmark::State& state, const char* label)
+{
+    Mutex mutex;
+    long counter = 0;
+    for (auto _ : state) {
+        mutex.lock();
+        ++counter;
+        mutex.unlock();
+        benchmark::DoNotOptimize(counter);
+    }
+    state.SetLabel(label);
+}
 void MutexZm(benchmark::State& state)
 {
-    ZmMutex mutex;
-    long counter = 0;
-    for (auto _ : state) {
-        mutex.lock();
-        ++counter;
-        mutex.unlock();
-        benchmark::DoNotOptimize(counter);
-    }
-    state.SetLabel("ZmMutex::lock + unlock");
+    LockUnlock<ZmMutex>(state, "ZmMutex::lock + unlock");
 }
-BENCHMARK(MutexZm)->Name("ZmMutex_lockUnlock/zm");
-
 void MutexPeer(benchmark::State& state)
 {
-    std::mutex mutex;
-    long counter = 0;
-    for (auto _ : state) {
-        mutex.lock();
-        ++counter;
-        mutex.unlock();
-        benchmark::DoNotOptimize(counter);
-    }
-    state.SetLabel("std::mutex::lock + unlock");
+    LockUnlock<std::mutex>(state, "std::mutex::lock + unlock");
 }
+BENCHMARK(MutexZm)->Name("ZmMutex_lockUnlock/zm");
 BENCHMARK(MutexPeer)->Name("ZmMutex_lockUnlock/peer");
 
 // --- worker thread round trip ---------------------------------------------------------------------

@@ -5,6 +5,8 @@
 #include <stdio.h>
 #include <stdlib.h>
 
+#include <fstream>
+#include <iterator>
 #include <string>
 
 class ScratchDir {
@@ -24,6 +26,18 @@ public:
     /// The directory, without a trailing '/'; empty if it could not be made.
     const std::string& path() const { return m_path; }
     std::string operator/(const std::string& name) const { return m_path + "/" + name; }
+
+    /// Writes \p text to the file \p rel below the directory (its folder must exist).
+    void write(const std::string& rel, const std::string& text = "") const
+    {
+        std::ofstream(*this / rel) << text;
+    }
+    /// The whole content of the file \p rel below the directory ("" when it cannot be read).
+    std::string read(const std::string& rel) const
+    {
+        std::ifstream in(*this / rel, std::ios::binary);
+        return std::string(std::istreambuf_iterator<char>(in), {});
+    }
 
     /// Removes \p path and everything below it, never following a symbolic link.
     static void removeTree(const std::string& path)

@@ -57,15 +57,8 @@ protected:
         m_oldTmp == "\x01" ? ::unsetenv("TMPDIR") : ::setenv("TMPDIR", m_oldTmp.c_str(), 1);
     }
     std::string path(const std::string& rel) const { return m_dir + "/" + rel; }
-    void write(const std::string& rel, const std::string& text = "") const
-    {
-        std::ofstream(path(rel)) << text;
-    }
-    std::string read(const std::string& rel) const
-    {
-        std::ifstream in(path(rel), std::ios::binary);
-        return std::string(std::istreambuf_iterator<char>(in), {});
-    }
+    void write(const std::string& rel, const std::string& text = "") const { m_scratch.write(rel, text); }
+    std::string read(const std::string& rel) const { return m_scratch.read(rel); }
     void link(const std::string& target, const std::string& rel) const
     {
         fs::create_symlink(target, path(rel));

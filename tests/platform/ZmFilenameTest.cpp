@@ -50,15 +50,8 @@ protected:
         }
     }
     std::string path(const std::string& rel) const { return m_dir + "/" + rel; }
-    void write(const std::string& rel, const std::string& text = "") const
-    {
-        std::ofstream(path(rel)) << text;
-    }
-    std::string read(const std::string& rel) const
-    {
-        std::ifstream in(path(rel), std::ios::binary);
-        return std::string(std::istreambuf_iterator<char>(in), {});
-    }
+    void write(const std::string& rel, const std::string& text = "") const { m_scratch.write(rel, text); }
+    std::string read(const std::string& rel) const { return m_scratch.read(rel); }
     ScratchDir m_scratch;
     std::string m_dir;
     std::filesystem::path m_cwd;

@@ -419,40 +419,41 @@ void ZmLogFile::trace(ZmLogLevel level, const char* module, const char* message)
     }
 }
 
+namespace {
+
+void vtrace(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const char* module, const char* format,
+            va_list args)
+{
+    if (!d.drops(level)) {
+        const Formatted message(format, args);
+        traceText(log, d, level, module, message.text(), message.length());
+    }
+}
+
+} // namespace
+
 void ZmLogFile::tracef(ZmLogLevel level, const char* module, const char* format, ...)
 {
-    if (m_d->drops(level)) {
-        return;
-    }
     va_list args;
     va_start(args, format);
-    const Formatted message(format, args);
+    vtrace(*this, *m_d, level, module, format, args);
     va_end(args);
-    traceText(*this, *m_d, level, module, message.text(), message.length());
 }
 
 void ZmLogFile::errorf(const char* format, ...)
 {
-    if (m_d->drops(ZmLogError)) {
-        return;
-    }
     va_list args;
     va_start(args, format);
-    const Formatted message(format, args);
+    vtrace(*this, *m_d, ZmLogError, nullptr, format, args);
     va_end(args);
-    traceText(*this, *m_d, ZmLogError, nullptr, message.text(), message.length());
 }
 
 void ZmLogFile::warnf(const char* format, ...)
 {
-    if (m_d->drops(ZmLogWarning)) {
-        return;
-    }
     va_list args;
     va_start(args, format);
-    const Formatted message(format, args);
+    vtrace(*this, *m_d, ZmLogWarning, nullptr, format, args);
     va_end(args);
-    traceText(*this, *m_d, ZmLogWarning, nullptr, message.text(), message.length());
 }
 
 void ZmLogFile::print(const char* module, const char* message)
