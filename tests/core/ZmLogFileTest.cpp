@@ -22,7 +22,7 @@
 namespace {
 
 // True when \p text has the shape of \p pattern, where '#' stands for one digit and every other
-// character for itself. (std::regex would do, but trips GCC's uninitialised-use warning at -O1.)
+// character for itself.
 bool hasShape(const std::string& text, const std::string& pattern)
 {
     if (text.size() != pattern.size()) {
