@@ -8,7 +8,7 @@ set -euo pipefail
 packages=(make cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev)
 for extra in "$@"; do
   case "$extra" in
-    bench) packages+=(libbenchmark-dev libspdlog-dev) ;;
+    bench) packages+=(libbenchmark-dev libspdlog-dev libssl-dev) ;;
     fuzz) packages+=(clang libclang-rt-dev) ;;
     tidy) packages+=(clang-tidy clang-format) ;;
     *) echo "install-deps: unknown group '$extra'" >&2; exit 2 ;;

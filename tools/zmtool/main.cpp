@@ -16,6 +16,9 @@ struct Command {
 
 const Command kCommands[] = {
     {"demo", "walk through the library on built-in sample data", zmtool::runDemo},
+    {"md5", "MD5 digests of files, printed as md5sum does", zmtool::runMd5},
+    {"cksum", "CRC and size of files, printed as cksum does", zmtool::runCksum},
+    {"uuid", "random (version 4) UUIDs, plain or braced", zmtool::runUuid},
 };
 
 void printUsage(FILE* out)

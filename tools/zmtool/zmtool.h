@@ -5,5 +5,8 @@
 namespace zmtool {
 
 int runDemo(int argc, char** argv);
+int runMd5(int argc, char** argv);
+int runCksum(int argc, char** argv);
+int runUuid(int argc, char** argv);
 
 } // namespace zmtool

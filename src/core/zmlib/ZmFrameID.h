@@ -1,0 +1,36 @@
+/// \file
+/// Identifiers of frames.
+#pragma once
+
+#include <zmlib/ZmExport.h>
+#include <zmlib/ZmID.h>
+#include <zmlib/ZmString.h>
+
+#include <cstdint>
+
+/// Names a frame with a signed 64-bit number; -1 is empty. Ordered by the signed value.
+///
+/// `isValid()` is true for every value >= -1, the empty value included; only more negative values
+/// are invalid. That is intended: callers treat "no frame yet" as a valid state.
+///
+/// A plain value: copy it freely between threads. Nothing fails: a text that is no number reads
+/// as the runtime's 64-bit `atoi` reads it (0 when nothing converts).
+class ZMLIB_API ZmFrameID : public ZmID<int64_t, -1> {
+public:
+    constexpr ZmFrameID() noexcept = default;
+    constexpr explicit ZmFrameID(int64_t v) noexcept : ZmID<int64_t, -1>(v) {}
+
+    static ZmFrameID fromInt64(int64_t v) noexcept { return ZmFrameID(v); }
+    /// The number at the start of \p text (`ZmString::toInt64`); null gives frame 0.
+    static ZmFrameID fromLatin1(const char* text);
+    /// The decimal value.
+    ZmString toZmString() const;
+
+    /// Every value >= -1 (intended, see above).
+    bool isValid() const noexcept { return value() >= -1; }
+    /// Whether this frame lies within [\p first, \p last]; an empty bound is open on its side.
+    bool isInRange(const ZmFrameID& first, const ZmFrameID& last) const noexcept
+    {
+        return (first.isEmpty() || first.value() <= value()) && (last.isEmpty() || value() <= last.value());
+    }
+};

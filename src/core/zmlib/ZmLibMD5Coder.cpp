@@ -1,0 +1,133 @@
+#include <zmlib/ZmLibMD5Coder.h>
+#include <zmlib/ZmLibMD5List.h>
+
+#include <cstring>
+
+namespace ZmLib {
+
+void MD5Coder::append(const void* data, uint64_t n) noexcept
+{
+    if (!m_running) {
+        return;
+    }
+    if (n == 0) {
+        // Intended: an empty piece feeds the integer 4711 so that it still changes the digest;
+        // stored fingerprints depend on it.
+        static const unsigned char k4711[4] = {0x67, 0x12, 0x00, 0x00};
+        m_coder.crcMD5Update(k4711, 4);
+        return;
+    }
+    // Intended: the count is passed on as 32 bits, as the stored fingerprints were computed.
+    m_coder.crcMD5Update(static_cast<const unsigned char*>(data), static_cast<unsigned int>(n));
+}
+
+MD5 MD5Coder::finalize() noexcept
+{
+    if (m_running) {
+        m_coder.crcMD5Final();
+        m_running = false;
+    }
+    return hash();
+}
+
+MD5 MD5Coder::hash() const noexcept
+{
+    unsigned char bytes[16];
+    m_coder.crcMD5Query(bytes);
+    return MD5::fromBytes(bytes);
+}
+
+namespace {
+
+template <class T>
+MD5Coder& feed(MD5Coder& coder, const T& v) noexcept
+{
+    coder.append(&v, sizeof v);
+    return coder;
+}
+
+// A 64-bit count, then \p n bytes (none for n = 0: the count alone says "empty").
+MD5Coder& feedCounted(MD5Coder& coder, const void* data, uint64_t n) noexcept
+{
+    coder.append(&n, sizeof n);
+    if (n != 0) {
+        coder.append(data, n);
+    }
+    return coder;
+}
+
+} // namespace
+
+MD5Coder& operator<<(MD5Coder& coder, char v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, unsigned char v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, short v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, unsigned short v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, int v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, unsigned int v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, float v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, int64_t v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, uint64_t v) noexcept
+{
+    return feed(coder, v);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmUniqueID& v) noexcept
+{
+    return feed(coder, v.value());
+}
+
+MD5Coder& operator<<(MD5Coder& coder, const MD5& v) noexcept
+{
+    unsigned char bytes[16];
+    v.getBytes(bytes);
+    coder.append(bytes, 16);
+    return coder;
+}
+
+MD5Coder& operator<<(MD5Coder& coder, const char* v) noexcept
+{
+    if (v == nullptr) {
+        v = "";
+    }
+    return feedCounted(coder, v, std::strlen(v) + 1);
+}
+
+MD5Coder& operator<<(MD5Coder& coder, const ZmString& v) noexcept
+{
+    return feedCounted(coder, v.getString(), uint64_t(v.size()));
+}
+
+MD5Coder& operator<<(MD5Coder& coder, const std::string& v) noexcept
+{
+    return feedCounted(coder, v.data(), v.size());
+}
+
+MD5Coder& operator<<(MD5Coder& coder, const MD5List& v)
+{
+    return coder << v.hash();
+}
+
+} // namespace ZmLib

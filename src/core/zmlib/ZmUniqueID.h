@@ -1,0 +1,31 @@
+/// \file
+/// Identifiers of unique objects.
+#pragma once
+
+#include <zmlib/ZmExport.h>
+#include <zmlib/ZmID.h>
+#include <zmlib/ZmString.h>
+
+#include <cstdint>
+
+/// Names a unique object with a signed 64-bit number; 0 is empty. Ordered by the signed value.
+///
+/// A plain value: copy it freely between threads. Nothing fails: a text that is no number reads
+/// as the runtime's 64-bit `atoi` reads it (0 when nothing converts).
+class ZMLIB_API ZmUniqueID : public ZmID<int64_t, 0> {
+public:
+    constexpr ZmUniqueID() noexcept = default;
+    constexpr explicit ZmUniqueID(int64_t v) noexcept : ZmID<int64_t, 0>(v) {}
+
+    static ZmUniqueID fromInt64(int64_t v) noexcept { return ZmUniqueID(v); }
+    /// The number at the start of \p text (`ZmString::toInt64`); null gives the empty identifier.
+    static ZmUniqueID fromLatin1(const char* text);
+    /// The decimal value.
+    ZmString toZmString() const;
+
+    /// -1, 0 or 1, by the signed value.
+    static int compare(const ZmUniqueID& a, const ZmUniqueID& b) noexcept
+    {
+        return a.value() < b.value() ? -1 : (a.value() > b.value() ? 1 : 0);
+    }
+};
