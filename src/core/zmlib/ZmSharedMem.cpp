@@ -1,0 +1,249 @@
+// Named shared memory over POSIX shared-memory objects.
+//
+// A POSIX object outlives its users until it is unlinked, so the holders count themselves with
+// file locks: every process that has a block mapped keeps the object's descriptor open with a
+// shared flock(). A holder that lets go drops its lock and tries for an exclusive one without
+// waiting; it gets it only when no other holder is left, and then unlinks the name. The kernel
+// drops the lock of a process that dies, so a crash never leaves a count wrong; an object is left
+// behind only when the last holder dies without letting go, and the next process to use that
+// name takes it over and removes it when it is done.
+//
+// A process that opens a name can race with one that is removing it; so, once its shared lock is
+// taken, every opener checks that the object is still linked and starts over when it is not. An
+// object of size 0 is one whose creator has not sized it yet; openers wait for it, and remove it
+// as stale when it stays empty and unlocked for a while (a creator that died before sizing it).
+
+#include <zmlib/ZmSharedMem.h>
+#include <zmlib/ZmString.h>
+
+#include <atomic>
+#include <cerrno>
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/mman.h>
+#include <sys/stat.h>
+#include <time.h>
+#include <unistd.h>
+
+struct ZmSharedMemPrivate {
+    std::atomic<int> refs{1};
+    bool valid = false;
+    /// The open object, holding our shared lock; -1 for none (and for a block without a name).
+    int fd = -1;
+    char* view = nullptr;
+    uint64_t viewSize = 0;
+    /// The POSIX name, needed to unlink the object.
+    ZmString objectName;
+    /// The process that took the lock: a child that inherited the object by fork() shares that
+    /// lock with its parent and must not release it.
+    pid_t holderPid = 0;
+};
+
+namespace {
+
+/// Longest mapped name; the component after '/' may have at most 255 bytes.
+constexpr int kMaxObjectName = 200;
+/// Tries before giving up on a name that keeps changing under us.
+constexpr int kMaxAttempts = 5000;
+/// Sightings of an empty object (1 ms apart) before it counts as abandoned by its creator.
+constexpr int kStaleAfter = 200;
+
+ZmString objectName(const char* name)
+{
+    static const char hex[] = "0123456789ABCDEF";
+    ZmString out("/zmshm.");
+    for (const unsigned char* p = reinterpret_cast<const unsigned char*>(name); *p != 0; ++p) {
+        const unsigned char c = *p;
+        if ((c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '.' ||
+            c == '_' || c == '-') {
+            out += char(c);
+        } else {
+            out += '%';
+            out += hex[c >> 4];
+            out += hex[c & 15];
+        }
+    }
+    if (out.length() > kMaxObjectName) {
+        // FNV-1a of the whole name keeps long names apart; '~' never comes out of the escaping
+        // above, so a cut name cannot meet a short one.
+        uint64_t hash = 14695981039346656037ULL;
+        for (const unsigned char* p = reinterpret_cast<const unsigned char*>(name); *p != 0; ++p) {
+            hash = (hash ^ *p) * 1099511628211ULL;
+        }
+        out.removeLast(out.length() - (kMaxObjectName - 17));
+        out += '~';
+        for (int shift = 60; shift >= 0; shift -= 4) {
+            out += hex[(hash >> shift) & 15];
+        }
+    }
+    return out;
+}
+
+int lockFile(int fd, int operation)
+{
+    int rc;
+    do {
+        rc = flock(fd, operation);
+    } while (rc != 0 && errno == EINTR);
+    return rc;
+}
+
+void sleepOneMs()
+{
+    timespec ts{0, 1000000};
+    nanosleep(&ts, nullptr);
+}
+
+/// Unmaps the view and lets go of the object, unlinking it when this was its last holder.
+void release(ZmSharedMemPrivate& d)
+{
+    if (d.view != nullptr) {
+        munmap(d.view, d.viewSize);
+    }
+    d.view = nullptr;
+    d.valid = false;
+    if (d.fd < 0) {
+        return;
+    }
+    if (d.holderPid == getpid()) {
+        lockFile(d.fd, LOCK_UN);
+        struct stat st;
+        // While we hold the exclusive lock nobody else can unlink the object, so when it is still
+        // linked the name is still ours.
+        if (lockFile(d.fd, LOCK_EX | LOCK_NB) == 0 && fstat(d.fd, &st) == 0 && st.st_nlink > 0) {
+            shm_unlink(d.objectName.getString());
+        }
+    }
+    close(d.fd);
+    d.fd = -1;
+}
+
+bool attachAnonymous(ZmSharedMemPrivate& d, uint64_t bytes)
+{
+    void* view = mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+    if (view == MAP_FAILED) {
+        return false;
+    }
+    d.view = static_cast<char*>(view);
+    d.viewSize = bytes;
+    d.valid = true;
+    return true;
+}
+
+bool attach(ZmSharedMemPrivate& d, const char* name, uint64_t size)
+{
+    const uint64_t granule = uint64_t(sysconf(_SC_PAGESIZE));
+    // Intended: always one granule more than size rounded down, even when size is a whole number
+    // of granules.
+    const uint64_t granules = size / granule + 1;
+    if (granules > uint64_t(INT64_MAX) / granule) {
+        return false;
+    }
+    const uint64_t bytes = granules * granule;
+    if (name == nullptr || name[0] == 0) {
+        return attachAnonymous(d, bytes);
+    }
+    const ZmString object = objectName(name);
+    const char* objectPath = object.getString();
+    int emptySeen = 0;
+    for (int attempt = 0; attempt < kMaxAttempts; ++attempt) {
+        bool created = false;
+        int fd = shm_open(objectPath, O_RDWR, 0600);
+        if (fd < 0) {
+            if (errno != ENOENT) {
+                return false;
+            }
+            fd = shm_open(objectPath, O_RDWR | O_CREAT | O_EXCL, 0600);
+            if (fd < 0) {
+                if (errno == EEXIST) {
+                    continue; // someone else created it meanwhile: open theirs
+                }
+                return false;
+            }
+            created = true;
+        }
+        struct stat st;
+        if (lockFile(fd, LOCK_SH) != 0 || fstat(fd, &st) != 0) {
+            close(fd);
+            return false;
+        }
+        if (st.st_nlink == 0) {
+            close(fd); // its last holder removed it before we got our lock: start over
+            continue;
+        }
+        if (created) {
+            if (ftruncate(fd, off_t(bytes)) != 0) {
+                d.fd = fd;
+                d.objectName = object;
+                d.holderPid = getpid();
+                release(d);
+                return false;
+            }
+            st.st_size = off_t(bytes);
+        } else if (st.st_size == 0) {
+            // Not sized yet. When it stays so with nobody holding it, its creator is gone.
+            if (++emptySeen >= kStaleAfter && lockFile(fd, LOCK_EX | LOCK_NB) == 0 && fstat(fd, &st) == 0 &&
+                st.st_size == 0 && st.st_nlink > 0) {
+                shm_unlink(objectPath);
+                emptySeen = 0;
+            }
+            close(fd);
+            sleepOneMs();
+            continue;
+        }
+        d.fd = fd;
+        d.objectName = object;
+        d.holderPid = getpid();
+        d.viewSize = uint64_t(st.st_size);
+        void* view = mmap(nullptr, d.viewSize, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0);
+        if (view == MAP_FAILED) {
+            return false; // the object stays held until the next attempt or the destructor
+        }
+        d.view = static_cast<char*>(view);
+        d.valid = true;
+        return true;
+    }
+    return false;
+}
+
+void unref(ZmSharedMemPrivate* d)
+{
+    if (d->refs.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+        release(*d);
+        delete d;
+    }
+}
+
+} // namespace
+
+ZmSharedMem::ZmSharedMem() : m_d(new ZmSharedMemPrivate)
+{}
+
+// Copies share the attachment on purpose: both return the same view, and the last one releases it.
+ZmSharedMem::ZmSharedMem(const ZmSharedMem& other) : m_d(other.m_d)
+{
+    m_d->refs.fetch_add(1, std::memory_order_relaxed);
+}
+
+ZmSharedMem& ZmSharedMem::operator=(const ZmSharedMem& other)
+{
+    other.m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    unref(m_d);
+    m_d = other.m_d;
+    return *this;
+}
+
+ZmSharedMem::~ZmSharedMem()
+{
+    unref(m_d);
+}
+
+char* ZmSharedMem::buffer(const char* name, uint64_t size)
+{
+    if (m_d->valid) {
+        return m_d->view;
+    }
+    // An earlier call may have opened the object without mapping it; start from scratch.
+    release(*m_d);
+    return attach(*m_d, name, size) ? m_d->view : nullptr;
+}
