@@ -157,6 +157,54 @@ bool demoCore()
     return kept && counted && removed;
 }
 
+bool demoFingerprints()
+{
+    heading("fingerprints: MD5 and CRC of the header line");
+    const auto* bytes = reinterpret_cast<const unsigned char*>(kHeaderLine);
+    const unsigned n = unsigned(sizeof kHeaderLine - 1);
+    ZmLib::MD5Coder whole;
+    whole.append(bytes, n);
+    const ZmLib::MD5 digest = whole.finalize();
+    // The same bytes fed in pieces of 7 must give the same digest.
+    ZmLib::MD5Coder pieces;
+    for (unsigned at = 0; at < n; at += 7) {
+        pieces.append(bytes + at, n - at < 7 ? n - at : 7);
+    }
+    const bool same = pieces.finalize() == digest;
+    ZmString hex;
+    digest.toString(hex);
+    std::printf("  MD5  %s (fed whole and in pieces of 7: %s)\n", hex.getString(),
+                same ? "same" : "DIFFERENT");
+    std::printf("  CRC  %u over %u bytes (as cksum computes it)\n", ZmCoder::crc(bytes, n), n);
+    // A list of the digests of each field, combined into one fingerprint of the header.
+    ZmLib::MD5List fields(true);
+    for (ZmStringTokenizer tokens(kHeaderLine); tokens.hasMoreTokens();) {
+        ZmLib::MD5Coder field;
+        field << tokens.nextToken();
+        fields.insert(field.finalize());
+    }
+    fields.hash().toString(hex);
+    std::printf("  %lld field digests combined: %s\n", static_cast<long long>(fields.values().size()),
+                hex.getString());
+    std::printf("  a new identifier for this run: %s\n",
+                ZmUUID::generateUUID().toFormattedString().getString());
+    return same;
+}
+
+void printProcessFigures()
+{
+    heading("process: this process's memory figures");
+    const ZmProcessInfo self{int64_t(kvCurrentProcessId())};
+    if (!self.found()) {
+        std::printf("  not available\n");
+        return;
+    }
+    const double mib = 1024.0 * 1024.0;
+    std::printf("  working set %.1f MiB (peak %.1f MiB), committed %.1f MiB (peak %.1f MiB)\n",
+                double(self.workingSetSize()) / mib, double(self.peakWorkingSetSize()) / mib,
+                double(self.pagefileUsage()) / mib, double(self.peakPagefileUsage()) / mib);
+}
+
 } // namespace
 
 int zmtool::runDemo(int argc, char** argv)
@@ -174,9 +222,17 @@ int zmtool::runDemo(int argc, char** argv)
     log.setDefaultModule("zmtool");
     const bool logOpen = log.open(false);
     log.tracef(ZmLogInfo, "demo", "zmlib %s demo started", ZMLIB_VERSION_STRING);
+    // The stopwatch writes each step's time to the log ("--- demo [n]: ... msec (+ ... ms)").
+    ZmWatch watch("demo", true);
+    bool (*const steps[])() = {demoStrings, demoCore, demoFingerprints};
     bool ok = true;
-    ok = demoStrings() && ok;
-    ok = demoCore() && ok;
+    int index = 0;
+    for (bool (*step)() : steps) {
+        ok = step() && ok;
+        watch.dump(++index);
+    }
+    std::printf("\nsteps timed in the log: %d, %d ms in all\n", index, watch.getTimeMSec());
+    printProcessFigures();
     log.tracef(ZmLogInfo, "demo", "demo %s", ok ? "finished" : "FAILED");
     log.flush();
     std::printf("\ndemo %s\n", ok ? "finished" : "FAILED");
