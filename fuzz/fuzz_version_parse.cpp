@@ -8,6 +8,7 @@
 //   version;
 // - the printed form followed by a dot and any text (the input itself) parses to the same version.
 #include "FuzzCheck.h"
+#include "ModelVersion.h"
 
 #include <zmlib/ZmVersion.h>
 
@@ -24,26 +25,6 @@ std::array<unsigned, 4> valuesOf(const ZmVersion& v)
     return {v.majorVersion(), v.minorVersion(), v.patchLevel(), v.buildNumber()};
 }
 
-std::array<unsigned, 4> streamParse(const std::string& text)
-{
-    std::istringstream in(text);
-    std::array<unsigned, 4> v{};
-    for (unsigned& value : v) {
-        if (!(in >> value)) {
-            return {};
-        }
-        const int c = in.peek();
-        if (c == std::char_traits<char>::eof()) {
-            break;
-        }
-        if (c != '.') {
-            return {};
-        }
-        in.get();
-    }
-    return v;
-}
-
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
@@ -52,7 +33,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     const ZmVersion v(text);
 
     if (text.find_first_of("+-") == std::string::npos) {
-        FUZZ_CHECK(valuesOf(v) == streamParse(text));
+        FUZZ_CHECK(valuesOf(v) == model::streamParseVersion(text));
     }
 
     const std::string printed = v.toString();

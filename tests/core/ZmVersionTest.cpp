@@ -1,3 +1,5 @@
+#include "../../fuzz/ModelVersion.h"
+
 #include <zmlib/ZmVersion.h>
 
 #include <gtest/gtest.h>
@@ -19,28 +21,6 @@ struct Version : ZmVersion {
 std::array<unsigned, 4> valuesOf(const ZmVersion& v)
 {
     return {v.majorVersion(), v.minorVersion(), v.patchLevel(), v.buildNumber()};
-}
-
-// The parse as stream extraction does it, step by step: a number, then the end or a dot, up to
-// four numbers. Only valid for texts without '+' or '-', which the stream would take as signs.
-std::array<unsigned, 4> streamParse(const std::string& text)
-{
-    std::istringstream in(text);
-    std::array<unsigned, 4> v{};
-    for (unsigned& value : v) {
-        if (!(in >> value)) {
-            return {};
-        }
-        const int c = in.peek();
-        if (c == std::char_traits<char>::eof()) {
-            break;
-        }
-        if (c != '.') {
-            return {};
-        }
-        in.get();
-    }
-    return v;
 }
 
 } // namespace
@@ -86,6 +66,7 @@ TEST(ZmVersion, PrintsAllFourValues)
     EXPECT_EQ(ZmVersion("7.1").toString(), "7.1.0.0");
     EXPECT_EQ(ZmVersion().toString(), "0.0.0.0");
     EXPECT_EQ(ZmVersion(4294967295u, 0, 12, 2311).toString(), "4294967295.0.12.2311");
+    EXPECT_EQ(ZmVersion(4294967295u, 0, 12, 2311).asZmVec4i(), ZmVec4i(-1, 0, 12, 2311));
 }
 
 TEST(ZmVersion, ParseAgreesWithStreamExtraction)
@@ -114,7 +95,7 @@ TEST(ZmVersion, ParseAgreesWithStreamExtraction)
             text.pop_back();
         }
         const ZmVersion v(text);
-        ASSERT_EQ(valuesOf(v), streamParse(text)) << '"' << text << '"';
+        ASSERT_EQ(valuesOf(v), model::streamParseVersion(text)) << '"' << text << '"';
         nonNull += v.isNull() ? 0 : 1;
         const std::string printed = v.toString();
         ASSERT_EQ(printed, std::to_string(v.majorVersion()) + "." + std::to_string(v.minorVersion()) + "." +

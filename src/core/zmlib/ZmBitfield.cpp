@@ -228,36 +228,38 @@ void ZmBitfield::resize(uint64_t n, INIT init)
 
 // --- ranges and whole fields -------------------------------------------------------------------
 
-void ZmBitfield::setRange(uint64_t from, uint64_t to) noexcept
+namespace {
+
+// Sets (\p value) or clears the bits from \p from to \p to inclusive: the partial words at the
+// ends through masks, the words between at once.
+void fillRange(uint32_t* data, uint64_t from, uint64_t to, bool value) noexcept
 {
     if (from > to) {
         return;
     }
-    const uint64_t w0 = from / NBITS, w1 = to / NBITS;
-    const uint32_t m0 = ~0u << (from % NBITS), m1 = ~0u >> (NBITS - 1 - to % NBITS);
+    constexpr uint64_t kBits = ZmBitfield::NBITS;
+    const uint64_t w0 = from / kBits, w1 = to / kBits;
+    const uint32_t m0 = ~0u << (from % kBits), m1 = ~0u >> (kBits - 1 - to % kBits);
+    const auto apply = [value](uint32_t& word, uint32_t mask) { word = value ? word | mask : word & ~mask; };
     if (w0 == w1) {
-        m_data[w0] |= m0 & m1;
+        apply(data[w0], m0 & m1);
         return;
     }
-    m_data[w0] |= m0;
-    std::memset(m_data + w0 + 1, 0xff, (w1 - w0 - 1) * sizeof(uint32_t));
-    m_data[w1] |= m1;
+    apply(data[w0], m0);
+    std::memset(data + w0 + 1, value ? 0xff : 0, (w1 - w0 - 1) * sizeof(uint32_t));
+    apply(data[w1], m1);
+}
+
+} // namespace
+
+void ZmBitfield::setRange(uint64_t from, uint64_t to) noexcept
+{
+    fillRange(m_data, from, to, true);
 }
 
 void ZmBitfield::unsetRange(uint64_t from, uint64_t to) noexcept
 {
-    if (from > to) {
-        return;
-    }
-    const uint64_t w0 = from / NBITS, w1 = to / NBITS;
-    const uint32_t m0 = ~0u << (from % NBITS), m1 = ~0u >> (NBITS - 1 - to % NBITS);
-    if (w0 == w1) {
-        m_data[w0] &= ~(m0 & m1);
-        return;
-    }
-    m_data[w0] &= ~m0;
-    std::memset(m_data + w0 + 1, 0, (w1 - w0 - 1) * sizeof(uint32_t));
-    m_data[w1] &= ~m1;
+    fillRange(m_data, from, to, false);
 }
 
 void ZmBitfield::setAll() noexcept

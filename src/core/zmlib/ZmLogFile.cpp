@@ -89,7 +89,7 @@ struct ZmLogFilePrivate {
     void writeLocked(ZmLogLevel level, const ZmString& text);
     /// Writes the stamp (no terminator) to \p out, which has room for kMaxStamp bytes; returns
     /// its length.
-    size_t stampLocked(char* out, ZmLogFile::DateTimeFormat format);
+    size_t stampLocked(char* out, ZmLogFile::DateTimeFormat format, const timespec& now);
 };
 
 // --- levels ------------------------------------------------------------------------------------
@@ -186,13 +186,11 @@ ZmLogFile& getTheLogInstance()
 
 // --- writing -----------------------------------------------------------------------------------
 
-size_t ZmLogFilePrivate::stampLocked(char* out, ZmLogFile::DateTimeFormat format)
+size_t ZmLogFilePrivate::stampLocked(char* out, ZmLogFile::DateTimeFormat format, const timespec& now)
 {
     if (format != ZmLogFile::TimeOfDay && format != ZmLogFile::DateAndTime) {
         return 0;
     }
-    struct timespec now;
-    clock_gettime(CLOCK_REALTIME, &now);
     int ms = int(now.tv_nsec / 1000000);
     if (format == ZmLogFile::TimeOfDay && relativeTime) {
         int64_t seconds = int64_t(now.tv_sec) - relativeSeconds;
@@ -314,7 +312,7 @@ private:
 
 // Builds "<stamp>: <letter> [<module>] " into line; the message follows. One capacity check and
 // plain stores: this runs for every line.
-void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char* module)
+void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char* module, const timespec& now)
 {
     const char* name = module != nullptr && module[0] != 0 ? module : d.defaultModule.getString();
     const size_t nameLength = std::strlen(name);
@@ -323,7 +321,7 @@ void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char
         line.remax(need, -1);
     }
     char* const start = line.dataPtr();
-    char* p = start + d.stampLocked(start, d.dateTimeFormat);
+    char* p = start + d.stampLocked(start, d.dateTimeFormat, now);
     if (p != start) {
         *p++ = ':';
         *p++ = ' ';
@@ -383,9 +381,14 @@ private:
 void traceText(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const char* module, const char* text,
                size_t length)
 {
+    // The clock is read before the lock, as the message was formatted: the lock is held only to
+    // build and write the line. Lines of different threads may then differ from their stamps'
+    // order by the time a thread waits for the lock.
+    timespec now;
+    clock_gettime(CLOCK_REALTIME, &now);
     ZmMutexLocker lock(d.mutex);
     LineBuffer buffer(d);
-    beginLine(d, buffer.line(), level, module);
+    beginLine(d, buffer.line(), level, module, now);
     appendText(buffer.line(), text, length);
     // Many messages end in their own line feed; a line gets exactly one.
     if (length == 0 || text[length - 1] != '\n') {
@@ -737,7 +740,9 @@ void ZmLogFile::timeString(ZmString& out, DateTimeFormat format) const
 {
     char stamp[kMaxStamp];
     ZmMutexLocker lock(m_d->mutex);
-    out = ZmString(stamp, 0, int(m_d->stampLocked(stamp, format)));
+    timespec now;
+    clock_gettime(CLOCK_REALTIME, &now);
+    out = ZmString(stamp, 0, int(m_d->stampLocked(stamp, format, now)));
 }
 
 // --- helpers -----------------------------------------------------------------------------------

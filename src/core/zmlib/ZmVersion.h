@@ -3,8 +3,10 @@
 #pragma once
 
 #include <zmlib/ZmExport.h>
+#include <zmlib/ZmVec4i.h>
 
 #include <array>
+#include <cstdint>
 #include <string>
 #include <utility>
 
@@ -62,6 +64,11 @@ public:
 
     /// "major.minor.patch.build" in decimal, always all four values.
     std::string toString() const;
+    /// The four values in order; values above 2147483647 come out negative (two's complement).
+    ZmVec4i asZmVec4i() const
+    {
+        return ZmVec4i(int32_t(m_major), int32_t(m_minor), int32_t(m_patch), int32_t(m_build));
+    }
 
 protected:
     /// This version's and \p other's value at the first position where they differ; (0, 0) when

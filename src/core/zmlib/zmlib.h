@@ -53,6 +53,7 @@
 #include <zmlib/ZmTypedObject.h>
 #include <zmlib/ZmUUID.h>
 #include <zmlib/ZmUniqueID.h>
+#include <zmlib/ZmVec4i.h>
 #include <zmlib/ZmVersion.h>
 #include <zmlib/ZmWaitCondition.h>
 #include <zmlib/ZmWatch.h>
