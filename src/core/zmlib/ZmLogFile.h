@@ -96,7 +96,9 @@ public:
     /// created the current state is kept and false returned.
     bool open(bool force = false);
     /// Deletes the oldest "*.log" files (and the ".dmp" beside each) so that one more fits within
-    /// the count limit. Nothing with a limit of 0 or with date folders.
+    /// the count limit. Nothing with a limit of 0 or with date folders. Every "*.log" of the base
+    /// folder counts, whoever wrote it: give the log a folder of its own rather than the shared
+    /// temporary folder it starts with.
     void cleanUp();
     /// The open file's path; empty before the first `open()`.
     ZmString filePath() const;
