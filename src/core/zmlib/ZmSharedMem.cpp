@@ -13,10 +13,10 @@
 // object of size 0 is one whose creator has not sized it yet; openers wait for it, and remove it
 // as stale when it stays empty and unlocked for a while (a creator that died before sizing it).
 
+#include <zmlib/ZmSharedCount_p.h>
 #include <zmlib/ZmSharedMem.h>
 #include <zmlib/ZmString.h>
 
-#include <atomic>
 #include <cerrno>
 #include <fcntl.h>
 #include <sys/file.h>
@@ -26,7 +26,7 @@
 #include <unistd.h>
 
 struct ZmSharedMemPrivate {
-    std::atomic<int> refs{1};
+    ZmSharedCount refs;
     bool valid = false;
     /// The open object, holding our shared lock; -1 for none (and for a block without a name).
     int fd = -1;
@@ -208,7 +208,7 @@ bool attach(ZmSharedMemPrivate& d, const char* name, uint64_t size)
 
 void unref(ZmSharedMemPrivate* d)
 {
-    if (d->refs.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+    if (d->refs.unref()) {
         release(*d);
         delete d;
     }
@@ -222,12 +222,12 @@ ZmSharedMem::ZmSharedMem() : m_d(new ZmSharedMemPrivate)
 // Copies share the attachment on purpose: both return the same view, and the last one releases it.
 ZmSharedMem::ZmSharedMem(const ZmSharedMem& other) : m_d(other.m_d)
 {
-    m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    m_d->refs.ref();
 }
 
 ZmSharedMem& ZmSharedMem::operator=(const ZmSharedMem& other)
 {
-    other.m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    other.m_d->refs.ref();
     unref(m_d);
     m_d = other.m_d;
     return *this;

@@ -1,5 +1,6 @@
 #include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmMutex.h>
+#include <zmlib/ZmSharedCount_p.h>
 #include <zmlib/ZmThread.h>
 #include <zmlib/ZmWaitCondition.h>
 
@@ -46,11 +47,11 @@ struct ZmThreadPrivate {
     // The copy whose start() launched the current run.
     ZmThread* runner = nullptr;
     // Every ZmThread sharing this part holds one reference, and so does a run that is going.
-    std::atomic<int> refs{1};
+    ZmSharedCount refs;
 
     void release()
     {
-        if (refs.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+        if (refs.unref()) {
             const int rc = pthread_attr_destroy(&attr);
             if (rc != 0) {
                 getTheLogInstance().errorf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
@@ -82,12 +83,12 @@ ZmThread::ZmThread(const char* name) : m_d(new ZmThreadPrivate)
 // Copies share the thread on purpose: the copy and the source are the same thread.
 ZmThread::ZmThread(const ZmThread& other) : m_d(other.m_d)
 {
-    m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    m_d->refs.ref();
 }
 
 ZmThread& ZmThread::operator=(const ZmThread& other)
 {
-    other.m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    other.m_d->refs.ref();
     m_d->release();
     m_d = other.m_d;
     return *this;
@@ -118,12 +119,12 @@ void ZmThread::start()
         m_d->finished.wait(&m_d->stateMutex);
     }
     m_d->runner = this;
-    m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    m_d->refs.ref();
     const int rc = pthread_create(&m_d->handle, &m_d->attr, &ZmThread::trampoline, m_d);
     if (rc != 0) {
         // The destructor's text is reused for this warning on purpose; log readers match on it.
         getTheLogInstance().warnf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
-        m_d->refs.fetch_sub(1, std::memory_order_relaxed);
+        m_d->refs.unref(); // the run's reference; never the last, this object holds one too
         m_d->stateMutex.unlock();
         return;
     }

@@ -1,22 +1,22 @@
 #include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmMutex.h>
 #include <zmlib/ZmMutex_p.h>
+#include <zmlib/ZmSharedCount_p.h>
 #include <zmlib/ZmWaitCondition.h>
 #include <zmlib/ZmWaitCondition_p.h>
 
-#include <atomic>
 #include <pthread.h>
 
 struct ZmWaitConditionPrivate {
     pthread_cond_t cond;
-    std::atomic<int> refs{1};
+    ZmSharedCount refs;
 };
 
 namespace {
 
 void release(ZmWaitConditionPrivate* d)
 {
-    if (d->refs.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+    if (d->refs.unref()) {
         const int rc = pthread_cond_destroy(&d->cond);
         if (rc != 0) {
             getTheLogInstance().errorf("ZmWaitCondition::~ZmWaitCondition() failed (error code: %d)\n", rc);
@@ -39,12 +39,12 @@ ZmWaitCondition::ZmWaitCondition() : m_d(new ZmWaitConditionPrivate)
 // Copies share the condition on purpose: the copy and the source are the same condition.
 ZmWaitCondition::ZmWaitCondition(const ZmWaitCondition& other) : m_d(other.m_d)
 {
-    m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    m_d->refs.ref();
 }
 
 ZmWaitCondition& ZmWaitCondition::operator=(const ZmWaitCondition& other)
 {
-    other.m_d->refs.fetch_add(1, std::memory_order_relaxed);
+    other.m_d->refs.ref();
     release(m_d);
     m_d = other.m_d;
     return *this;
