@@ -5,7 +5,8 @@
 #   tools/install-deps.sh fuzz       ... plus clang and libFuzzer
 set -euo pipefail
 
-packages=(make cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev)
+# libeigen3-dev: the tests' and benchmarks' linear-algebra oracle, never linked into the library.
+packages=(make cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev libeigen3-dev)
 for extra in "$@"; do
   case "$extra" in
     bench) packages+=(libbenchmark-dev libspdlog-dev libssl-dev) ;;

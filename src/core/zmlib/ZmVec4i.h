@@ -14,6 +14,14 @@ public:
     /// No index check: \p i must be 0 to 3.
     constexpr int32_t& operator[](int i) noexcept { return m_v[i]; }
     constexpr const int32_t& operator[](int i) const noexcept { return m_v[i]; }
+    constexpr int32_t& x() noexcept { return m_v[0]; }
+    constexpr int32_t& y() noexcept { return m_v[1]; }
+    constexpr int32_t& z() noexcept { return m_v[2]; }
+    constexpr int32_t& w() noexcept { return m_v[3]; }
+    constexpr int32_t x() const noexcept { return m_v[0]; }
+    constexpr int32_t y() const noexcept { return m_v[1]; }
+    constexpr int32_t z() const noexcept { return m_v[2]; }
+    constexpr int32_t w() const noexcept { return m_v[3]; }
     constexpr bool operator==(const ZmVec4i& o) const noexcept
     {
         return m_v[0] == o.m_v[0] && m_v[1] == o.m_v[1] && m_v[2] == o.m_v[2] && m_v[3] == o.m_v[3];

@@ -3,10 +3,14 @@
 #pragma once
 
 #include <zmlib/KvSessionContextID.h>
+#include <zmlib/MathUtils.h>
 #include <zmlib/StringUtils.h>
 #include <zmlib/Zm128.h>
 #include <zmlib/ZmAllocator.h>
 #include <zmlib/ZmBitfield.h>
+#include <zmlib/ZmBox2f.h>
+#include <zmlib/ZmBox3f.h>
+#include <zmlib/ZmBox3i.h>
 #include <zmlib/ZmCallable.h>
 #include <zmlib/ZmCoder.h>
 #include <zmlib/ZmDArray.h>
@@ -53,6 +57,13 @@
 #include <zmlib/ZmTypedObject.h>
 #include <zmlib/ZmUUID.h>
 #include <zmlib/ZmUniqueID.h>
+#include <zmlib/ZmVec2f.h>
+#include <zmlib/ZmVec2i.h>
+#include <zmlib/ZmVec3d.h>
+#include <zmlib/ZmVec3f.h>
+#include <zmlib/ZmVec3i.h>
+#include <zmlib/ZmVec3l.h>
+#include <zmlib/ZmVec4f.h>
 #include <zmlib/ZmVec4i.h>
 #include <zmlib/ZmVersion.h>
 #include <zmlib/ZmWaitCondition.h>
