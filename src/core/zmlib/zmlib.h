@@ -33,6 +33,9 @@
 #include <zmlib/ZmLibMD5Coder.h>
 #include <zmlib/ZmLibMD5List.h>
 #include <zmlib/ZmLogFile.h>
+#include <zmlib/ZmMat3f.h>
+#include <zmlib/ZmMat4f.h>
+#include <zmlib/ZmMat4fCache.h>
 #include <zmlib/ZmMemory.h>
 #include <zmlib/ZmMemoryException.h>
 #include <zmlib/ZmMutex.h>
@@ -40,6 +43,7 @@
 #include <zmlib/ZmProcessInfo.h>
 #include <zmlib/ZmRemotificationID.h>
 #include <zmlib/ZmResult.h>
+#include <zmlib/ZmRotation.h>
 #include <zmlib/ZmScopedWatch.h>
 #include <zmlib/ZmSharedMem.h>
 #include <zmlib/ZmStdStringTokenizer.h>
