@@ -1,6 +1,15 @@
+#include <zmlib/ZmBox3f.h>
+#include <zmlib/ZmBox3i.h>
 #include <zmlib/ZmLibMD5.h>
 #include <zmlib/ZmLibMD5Coder.h>
 #include <zmlib/ZmLibMD5List.h>
+#include <zmlib/ZmMat3f.h>
+#include <zmlib/ZmMat4f.h>
+#include <zmlib/ZmPlane.h>
+#include <zmlib/ZmVec2f.h>
+#include <zmlib/ZmVec2i.h>
+#include <zmlib/ZmVec3l.h>
+#include <zmlib/ZmVec4f.h>
 
 #include "ScratchDir.h"
 
@@ -68,6 +77,19 @@ MD5 digestOf(const Bytes& bytes)
 MD5 randomDigest(std::mt19937_64& rng)
 {
     return MD5(Zm128(rng(), rng()));
+}
+
+// The little-endian bytes of \p values, one after another.
+template <class T>
+Bytes leBytes(std::initializer_list<T> values)
+{
+    Bytes out;
+    for (T v : values) {
+        unsigned char b[sizeof(T)];
+        std::memcpy(b, &v, sizeof v);
+        out.insert(out.end(), b, b + sizeof b);
+    }
+    return out;
 }
 
 Bytes bytesOf(const MD5& d)
@@ -212,6 +234,23 @@ TEST(ZmLibMD5Coder, TypedValuesFeedTheirLittleEndianBytes)
         {"std::string", [&](MD5Coder& c) { c << withZero; }, {4, 0, 0, 0, 0, 0, 0, 0, 'h', 'i', 0, 'x'}},
         {"empty std::string", [](MD5Coder& c) { c << std::string(); }, zeroCount},
         {"MD5List", [&](MD5Coder& c) { c << list; }, bytesOf(list.hash())},
+        {"ZmVec2f", [](MD5Coder& c) { c << ZmVec2f(1.5f, -2); }, leBytes({1.5f, -2.0f})},
+        {"ZmVec2i", [](MD5Coder& c) { c << ZmVec2i(-1, 7); }, leBytes({int32_t(-1), int32_t(7)})},
+        {"ZmVec3f", [](MD5Coder& c) { c << ZmVec3f(1, 2, 3); }, leBytes({1.0f, 2.0f, 3.0f})},
+        {"ZmVec3i", [](MD5Coder& c) { c << ZmVec3i(4, -5, 6); },
+         leBytes({int32_t(4), int32_t(-5), int32_t(6)})},
+        {"ZmVec3l", [](MD5Coder& c) { c << ZmVec3l(1ll << 40, -1, 2); },
+         leBytes({int64_t(1) << 40, int64_t(-1), int64_t(2)})},
+        {"ZmVec4f", [](MD5Coder& c) { c << ZmVec4f(1, 2, 3, 4); }, leBytes({1.0f, 2.0f, 3.0f, 4.0f})},
+        {"ZmPlane", [](MD5Coder& c) { c << ZmPlane(ZmVec3f(0, 0, 2), 3.0f); },
+         leBytes({0.0f, 0.0f, 1.0f, 3.0f})},
+        {"ZmBox3f", [](MD5Coder& c) { c << ZmBox3f(ZmVec3f(1, 2, 3), ZmVec3f(4, 5, 6)); },
+         leBytes({1.0f, 4.0f, 2.0f, 5.0f, 3.0f, 6.0f})},
+        {"ZmBox3i", [](MD5Coder& c) { c << ZmBox3i(0, 9, 1, 8, 2, 7); }, leBytes({0, 9, 1, 8, 2, 7})},
+        {"ZmMat3f", [](MD5Coder& c) { c << ZmMat3f(1, 2, 3, 4, 5, 6, 7, 8, 9); },
+         leBytes({1.f, 2.f, 3.f, 4.f, 5.f, 6.f, 7.f, 8.f, 9.f})},
+        {"ZmMat4f", [](MD5Coder& c) { c << ZmMat4f(1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16); },
+         leBytes({1.f, 2.f, 3.f, 4.f, 5.f, 6.f, 7.f, 8.f, 9.f, 10.f, 11.f, 12.f, 13.f, 14.f, 15.f, 16.f})},
     };
     Bytes all;
     MD5Coder chained;

@@ -1,5 +1,15 @@
+#include <zmlib/ZmBox3f.h>
+#include <zmlib/ZmBox3i.h>
 #include <zmlib/ZmLibMD5Coder.h>
 #include <zmlib/ZmLibMD5List.h>
+#include <zmlib/ZmMat3f.h>
+#include <zmlib/ZmMat4f.h>
+#include <zmlib/ZmPlane.h>
+#include <zmlib/ZmVec2f.h>
+#include <zmlib/ZmVec2i.h>
+#include <zmlib/ZmVec3f.h>
+#include <zmlib/ZmVec3l.h>
+#include <zmlib/ZmVec4f.h>
 
 #include <cstring>
 
@@ -128,6 +138,64 @@ MD5Coder& operator<<(MD5Coder& coder, const std::string& v) noexcept
 MD5Coder& operator<<(MD5Coder& coder, const MD5List& v)
 {
     return coder << v.hash();
+}
+
+namespace {
+
+template <class T>
+MD5Coder& feedComponents(MD5Coder& coder, const T* first, int n) noexcept
+{
+    coder.append(first, sizeof(T) * static_cast<unsigned>(n));
+    return coder;
+}
+
+} // namespace
+
+MD5Coder& operator<<(MD5Coder& coder, const ZmVec2f& v) noexcept
+{
+    return feedComponents(coder, &v[0], 2);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmVec2i& v) noexcept
+{
+    return feedComponents(coder, &v[0], 2);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmVec3f& v) noexcept
+{
+    return feedComponents(coder, v.getValue(), 3);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmVec3i& v) noexcept
+{
+    return feedComponents(coder, v.getValue(), 3);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmVec3l& v) noexcept
+{
+    return feedComponents(coder, v.getValue(), 3);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmVec4f& v) noexcept
+{
+    return feedComponents(coder, v.getValue(), 4);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmPlane& v) noexcept
+{
+    const ZmVec3f& n = v.getNormal();
+    const float words[4] = {n[0], n[1], n[2], v.getDistanceFromOrigin()};
+    return feedComponents(coder, words, 4);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmBox3f& v) noexcept
+{
+    return feedComponents(coder, v.getValue(), 6);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmBox3i& v) noexcept
+{
+    return feedComponents(coder, v.getValue(), 6);
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmMat3f& v) noexcept
+{
+    return feedComponents(coder, v[0], 9); // the rows are contiguous
+}
+MD5Coder& operator<<(MD5Coder& coder, const ZmMat4f& v) noexcept
+{
+    return feedComponents(coder, v[0], 16);
 }
 
 } // namespace ZmLib

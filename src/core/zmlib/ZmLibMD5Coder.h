@@ -11,6 +11,18 @@
 #include <cstdint>
 #include <string>
 
+class ZmBox3f;
+class ZmBox3i;
+class ZmMat3f;
+class ZmMat4f;
+class ZmPlane;
+class ZmVec2f;
+class ZmVec2i;
+class ZmVec3f;
+class ZmVec3i;
+class ZmVec3l;
+class ZmVec4f;
+
 namespace ZmLib {
 
 class MD5List;
@@ -65,5 +77,20 @@ ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmString& v) noexcept;
 ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const std::string& v) noexcept;
 /// The list's combined digest (16 bytes).
 ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const MD5List& v);
+
+// Geometry values are fed as their components in storage order: 8 bytes for the 2-vectors, 12 for
+// the 3-vectors of floats and integers, 16 for ZmVec4f and ZmPlane (normal, distance), 24 for the
+// boxes (xmin, xmax, ymin, ymax, zmin, zmax) and ZmVec3l, 36 and 64 for the matrices (row by row).
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmVec2f& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmVec2i& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmVec3f& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmVec3i& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmVec3l& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmVec4f& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmPlane& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmBox3f& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmBox3i& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmMat3f& v) noexcept;
+ZMLIB_API MD5Coder& operator<<(MD5Coder& coder, const ZmMat4f& v) noexcept;
 
 } // namespace ZmLib

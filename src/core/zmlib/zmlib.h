@@ -32,6 +32,8 @@
 #include <zmlib/ZmLibMD5.h>
 #include <zmlib/ZmLibMD5Coder.h>
 #include <zmlib/ZmLibMD5List.h>
+#include <zmlib/ZmLine.h>
+#include <zmlib/ZmLine2D.h>
 #include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmMat3f.h>
 #include <zmlib/ZmMat4f.h>
@@ -40,12 +42,14 @@
 #include <zmlib/ZmMemoryException.h>
 #include <zmlib/ZmMutex.h>
 #include <zmlib/ZmPackedIndexing.h>
+#include <zmlib/ZmPlane.h>
 #include <zmlib/ZmProcessInfo.h>
 #include <zmlib/ZmRemotificationID.h>
 #include <zmlib/ZmResult.h>
 #include <zmlib/ZmRotation.h>
 #include <zmlib/ZmScopedWatch.h>
 #include <zmlib/ZmSharedMem.h>
+#include <zmlib/ZmSphere.h>
 #include <zmlib/ZmStdStringTokenizer.h>
 #include <zmlib/ZmString.h>
 #include <zmlib/ZmStringTokenizer.h>
