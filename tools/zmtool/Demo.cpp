@@ -5,6 +5,7 @@
 
 #include <zmlib/zmlib.h>
 
+#include <cmath>
 #include <cstdio>
 #include <string>
 
@@ -191,6 +192,77 @@ bool demoFingerprints()
     return same;
 }
 
+void printVec(const char* label, const ZmVec3f& v)
+{
+    std::printf("  %-28s (%8.3f, %8.3f, %8.3f)\n", label, v[0], v[1], v[2]);
+}
+
+bool demoGeometry()
+{
+    heading("geometry: an oblique coronal view, its letters and a picking ray");
+    // A CT volume of 512 x 512 x 212 voxels of 0.7 x 0.7 x 0.625 mm, in patient coordinates
+    // (+x left, +y posterior, +z head).
+    const ZmBox3f volume(ZmVec3f(0.0f), ZmVec3f(512 * 0.7f, 512 * 0.7f, 212 * 0.625f));
+    const ZmVec3f centre = (volume.getMin() + volume.getMax()) * 0.5f;
+
+    // Screen to patient, row vectors: screen x goes to the patient's left, screen y (down) to the
+    // feet, screen z (into the screen) to posterior; then the view is tilted by 20 degrees about
+    // the patient's left-right axis and centred on the volume.
+    ZmMat4f view(1, 0, 0, 0, 0, 0, -1, 0, 0, 1, 0, 0, 0, 0, 0, 1);
+    ZmMat4f tilt;
+    tilt.setRotate(ZmRotation(ZmVec3f(1, 0, 0), 20.0f * 3.14159265f / 180.0f));
+    ZmMat4f move;
+    move.setTranslate(centre);
+    view *= tilt;
+    view *= move;
+    std::printf("  screen-to-patient matrix (rows; a point p maps to p * M):\n");
+    for (int r = 0; r < 4; ++r) {
+        std::printf("    %9.4f %9.4f %9.4f %9.4f\n", view[r][0], view[r][1], view[r][2], view[r][3]);
+    }
+    const ZmOrientationLetters letters(view);
+    const char* viewClass = letters.isAxial() ? "axial" : letters.isCoronal() ? "coronal" : "sagittal";
+    std::printf("  edge letters right/top/left/bottom: %s, a %s view\n", letters.join('/').c_str(),
+                viewClass);
+    const bool lettersOk = letters.isValid() && letters.right() == "L" && letters.bottom() == "F";
+
+    ZmMat4f product = view;
+    product *= view.inverse();
+    const bool inverseOk = product.equals(ZmMat4f::identity(), 1e-5f);
+    std::printf("  M times its inverse is the identity within 1e-5: %s\n", inverseOk ? "yes" : "NO");
+
+    // Pick the screen point (40, -25) mm from the centre: a ray into the screen through the volume.
+    const ZmVec3f picked = view.multVecMatrix(ZmVec3f(40, -25, 0));
+    ZmLine ray;
+    ray.setPosDir(picked, view.multDirMatrix(ZmVec3f(0, 0, 1)));
+    printVec("picked point (patient mm)", picked);
+    printVec("ray direction", ray.getDirection());
+    ZmVec3f enter, exit;
+    const bool hit = ray.intersect(volume, enter, exit, 0.0f);
+    bool pickOk = hit;
+    if (hit) {
+        printVec("enters the volume at", enter);
+        printVec("leaves it at", exit);
+        std::printf("  path through the volume: %.2f mm\n", (exit - enter).length());
+        // The plane of the middle axial slice cuts the ray between the two points.
+        const ZmPlane midSlice(ZmVec3f(0, 0, 1), centre);
+        ZmVec3f onSlice;
+        float t = 0;
+        pickOk = midSlice.intersect(ray, onSlice, &t) && std::fabs(midSlice.getDistance(onSlice)) < 1e-3f;
+        printVec("crosses the middle slice at", onSlice);
+        // The sphere around the volume holds the whole path through it.
+        ZmSphere bound;
+        bound.circumscribe(volume);
+        ZmVec3f nearPoint, farPoint;
+        pickOk = pickOk && bound.intersect(ray, nearPoint, farPoint) &&
+                 (farPoint - nearPoint).length() >= (exit - enter).length();
+        std::printf("  bounding sphere radius %.2f mm, its chord %.2f mm\n", bound.getRadius(),
+                    (farPoint - nearPoint).length());
+    } else {
+        std::printf("  the ray MISSED the volume\n");
+    }
+    return lettersOk && inverseOk && pickOk;
+}
+
 void printProcessFigures()
 {
     heading("process: this process's memory figures");
@@ -224,7 +296,7 @@ int zmtool::runDemo(int argc, char** argv)
     log.tracef(ZmLogInfo, "demo", "zmlib %s demo started", ZMLIB_VERSION_STRING);
     // The stopwatch writes each step's time to the log ("--- demo [n]: ... msec (+ ... ms)").
     ZmWatch watch("demo", true);
-    bool (*const steps[])() = {demoStrings, demoCore, demoFingerprints};
+    bool (*const steps[])() = {demoStrings, demoCore, demoFingerprints, demoGeometry};
     bool ok = true;
     int index = 0;
     for (bool (*step)() : steps) {

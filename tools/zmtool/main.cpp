@@ -19,6 +19,7 @@ const Command kCommands[] = {
     {"md5", "MD5 digests of files, printed as md5sum does", zmtool::runMd5},
     {"cksum", "CRC and size of files, printed as cksum does", zmtool::runCksum},
     {"uuid", "random (version 4) UUIDs, plain or braced", zmtool::runUuid},
+    {"orient", "anatomical edge labels and view class of a screen-to-patient matrix", zmtool::runOrient},
 };
 
 void printUsage(FILE* out)

@@ -8,5 +8,6 @@ int runDemo(int argc, char** argv);
 int runMd5(int argc, char** argv);
 int runCksum(int argc, char** argv);
 int runUuid(int argc, char** argv);
+int runOrient(int argc, char** argv);
 
 } // namespace zmtool

@@ -41,6 +41,7 @@
 #include <zmlib/ZmMemory.h>
 #include <zmlib/ZmMemoryException.h>
 #include <zmlib/ZmMutex.h>
+#include <zmlib/ZmOrientationLetters.h>
 #include <zmlib/ZmPackedIndexing.h>
 #include <zmlib/ZmPlane.h>
 #include <zmlib/ZmProcessInfo.h>
