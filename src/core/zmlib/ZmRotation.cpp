@@ -74,46 +74,48 @@ ZmRotation& ZmRotation::setValue(const ZmVec3f& fromDir, const ZmVec3f& fromUp, 
     return *this *= ZmRotation(toDir, phi);
 }
 
-ZmRotation& ZmRotation::setValue(const ZmMat3f& m) noexcept
+namespace {
+
+// The quaternion of a rotation matrix, from the largest of the trace and the diagonal elements.
+// \p root(a) gives sqrt(a + 1) * 0.5, where the two matrix sizes differ in precision and in what
+// stands for the 1.
+template <class Matrix, class Root>
+void quaternionFromMatrix(const Matrix& m, Root root, float q[4]) noexcept
 {
     const int i = m[0][0] > m[1][1] ? (m[0][0] > m[2][2] ? 0 : 2) : (m[1][1] > m[2][2] ? 1 : 2);
     const float tr = m[0][0] + m[1][1] + m[2][2];
     if (tr > m[i][i]) {
-        m_q[3] = float(std::sqrt(double(tr) + 1.0) * 0.5);
-        const float k = 4.0f * m_q[3];
-        m_q[0] = (m[1][2] - m[2][1]) / k;
-        m_q[1] = (m[2][0] - m[0][2]) / k;
-        m_q[2] = (m[0][1] - m[1][0]) / k;
+        q[3] = root(tr);
+        const float k = 4.0f * q[3];
+        q[0] = (m[1][2] - m[2][1]) / k;
+        q[1] = (m[2][0] - m[0][2]) / k;
+        q[2] = (m[0][1] - m[1][0]) / k;
     } else {
         const int j = (i + 1) % 3, k = (i + 2) % 3;
-        m_q[i] = float(std::sqrt(double(m[i][i] - m[j][j] - m[k][k]) + 1.0) * 0.5);
-        const float f = 4.0f * m_q[i];
-        m_q[j] = (m[i][j] + m[j][i]) / f;
-        m_q[k] = (m[i][k] + m[k][i]) / f;
-        m_q[3] = (m[j][k] - m[k][j]) / f;
+        q[i] = root(m[i][i] - m[j][j] - m[k][k]);
+        const float f = 4.0f * q[i];
+        q[j] = (m[i][j] + m[j][i]) / f;
+        q[k] = (m[i][k] + m[k][i]) / f;
+        q[3] = (m[j][k] - m[k][j]) / f;
     }
+}
+
+} // namespace
+
+ZmRotation& ZmRotation::setValue(const ZmMat3f& m) noexcept
+{
+    // The square root in double.
+    quaternionFromMatrix(
+        m, [](float a) { return float(std::sqrt(double(a) + 1.0) * 0.5); }, m_q);
     return *this;
 }
 
 ZmRotation& ZmRotation::setValue(const ZmMat4f& m) noexcept
 {
-    // As for the 3x3 form, with m[3][3] in place of the 1 under the square roots.
-    const int i = m[0][0] > m[1][1] ? (m[0][0] > m[2][2] ? 0 : 2) : (m[1][1] > m[2][2] ? 1 : 2);
-    const float tr = m[0][0] + m[1][1] + m[2][2];
-    if (tr > m[i][i]) {
-        m_q[3] = float(double(std::sqrt(tr + m[3][3])) * 0.5);
-        const float k = 4.0f * m_q[3];
-        m_q[0] = (m[1][2] - m[2][1]) / k;
-        m_q[1] = (m[2][0] - m[0][2]) / k;
-        m_q[2] = (m[0][1] - m[1][0]) / k;
-    } else {
-        const int j = (i + 1) % 3, k = (i + 2) % 3;
-        m_q[i] = float(double(std::sqrt(m[i][i] - m[j][j] - m[k][k] + m[3][3])) * 0.5);
-        const float f = 4.0f * m_q[i];
-        m_q[j] = (m[i][j] + m[j][i]) / f;
-        m_q[k] = (m[i][k] + m[k][i]) / f;
-        m_q[3] = (m[j][k] - m[k][j]) / f;
-    }
+    // m[3][3] in place of the 1, the square root in float and the halving in double.
+    const float m33 = m[3][3];
+    quaternionFromMatrix(
+        m, [m33](float a) { return float(double(std::sqrt(a + m33)) * 0.5); }, m_q);
     return *this;
 }
 

@@ -32,7 +32,9 @@ public:
     explicit ZmRotation(const float* q) noexcept { setValue(q); }
     /// Rotation by \p angle radians about \p axis (normalised first unless it is zero).
     ZmRotation(const ZmVec3f& axis, float angle) noexcept { setValue(axis, angle); }
-    /// The shortest rotation taking direction \p from to direction \p to.
+    /// The shortest rotation taking direction \p from to direction \p to. Opposite directions give
+    /// a half turn about an axis perpendicular to \p from, also when rounding puts their dot
+    /// product just above -1.
     ZmRotation(const ZmVec3f& from, const ZmVec3f& to) noexcept { setValue(from, to); }
     /// The rotation taking \p fromDir to \p toDir and then turning about \p toDir so that the
     /// rotated \p fromUp lies in the plane of \p toDir and \p toUp.
