@@ -140,62 +140,56 @@ MD5Coder& operator<<(MD5Coder& coder, const MD5List& v)
     return coder << v.hash();
 }
 
-namespace {
-
-template <class T>
-MD5Coder& feedComponents(MD5Coder& coder, const T* first, int n) noexcept
-{
-    coder.append(first, sizeof(T) * static_cast<unsigned>(n));
-    return coder;
-}
-
-} // namespace
+// Geometry values are fed as their bytes: each is its components in storage order and nothing else.
+static_assert(sizeof(ZmVec2f) == 8 && sizeof(ZmVec2i) == 8 && sizeof(ZmVec3f) == 12 &&
+                  sizeof(ZmVec3i) == 12 && sizeof(ZmVec4f) == 16 && sizeof(ZmPlane) == 16 &&
+                  sizeof(ZmVec3l) == 24 && sizeof(ZmBox3f) == 24 && sizeof(ZmBox3i) == 24 &&
+                  sizeof(ZmMat3f) == 36 && sizeof(ZmMat4f) == 64,
+              "geometry layouts");
 
 MD5Coder& operator<<(MD5Coder& coder, const ZmVec2f& v) noexcept
 {
-    return feedComponents(coder, &v[0], 2);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmVec2i& v) noexcept
 {
-    return feedComponents(coder, &v[0], 2);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmVec3f& v) noexcept
 {
-    return feedComponents(coder, v.getValue(), 3);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmVec3i& v) noexcept
 {
-    return feedComponents(coder, v.getValue(), 3);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmVec3l& v) noexcept
 {
-    return feedComponents(coder, v.getValue(), 3);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmVec4f& v) noexcept
 {
-    return feedComponents(coder, v.getValue(), 4);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmPlane& v) noexcept
 {
-    const ZmVec3f& n = v.getNormal();
-    const float words[4] = {n[0], n[1], n[2], v.getDistanceFromOrigin()};
-    return feedComponents(coder, words, 4);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmBox3f& v) noexcept
 {
-    return feedComponents(coder, v.getValue(), 6);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmBox3i& v) noexcept
 {
-    return feedComponents(coder, v.getValue(), 6);
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmMat3f& v) noexcept
 {
-    return feedComponents(coder, v[0], 9); // the rows are contiguous
+    return feed(coder, v);
 }
 MD5Coder& operator<<(MD5Coder& coder, const ZmMat4f& v) noexcept
 {
-    return feedComponents(coder, v[0], 16);
+    return feed(coder, v);
 }
 
 } // namespace ZmLib

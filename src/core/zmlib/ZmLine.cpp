@@ -47,7 +47,7 @@ bool ZmLine::intersect(float tolerance, const ZmVec3f& p) const noexcept
 
 bool ZmLine::intersect(const ZmBox3f& box, ZmVec3f& enter, ZmVec3f& exit, float tolerance) const noexcept
 {
-    if (box.xmin() > box.xmax() || box.ymin() > box.ymax() || box.zmin() > box.zmax()) {
+    if (box.isEmpty()) {
         enter.makeNaN();
         exit.makeNaN();
         return false;
@@ -97,7 +97,7 @@ bool ZmLine::intersect(const ZmBox3f& box, ZmVec3f& enter, ZmVec3f& exit, float 
 
 bool ZmLine::intersect(float tolerance, const ZmBox3f& box) const noexcept
 {
-    if (box.xmin() > box.xmax() || box.ymin() > box.ymax() || box.zmin() > box.zmax() || !isNumber())
+    if (box.isEmpty() || !isNumber())
         return false;
     // The margin is alpha + beta * t; each bound of each axis then reads c0 + c1 * t >= 0, a
     // half-line of parameters. The ray is picked when the half-lines meet in some t > 0.

@@ -11,9 +11,8 @@
 #include <cstdio>
 #include <string>
 
-#if defined(__SSE2__)
+// SSE2 is part of every x86-64 processor, the only target this library builds for.
 #include <emmintrin.h>
-#endif
 
 class ZmRotation;
 
@@ -244,11 +243,7 @@ public:
     {
         if (in.m_m[0][3] != 0.0f || in.m_m[1][3] != 0.0f || in.m_m[2][3] != 0.0f || in.m_m[3][3] != 1.0f)
             return 0;
-#if defined(__SSE2__)
         return affineInverseSse2(in, out);
-#else
-        return affineInverseScalar(in, out);
-#endif
     }
     /// LU decomposition in place with partial pivoting and implicit row scaling. Never fails and
     /// always returns 1, intended: an all-zero row gets 1e-6 on its diagonal and a zero pivot
@@ -279,42 +274,9 @@ private:
     /// The general inverse, through LUDecomposition and LUBackSubstitution.
     ZmMat4f inverseByLU() const noexcept;
 
-    // The two forms of affine_inverse for an affine \p in give the same bits: the columns of the
-    // upper inverse are the cross products of the rows (r1 x r2, r2 x r0, r0 x r1), the
-    // determinant's products are (r0 * r1.yzx) * r2.zxy and (r0.zxy * r1.yzx) * r2, and pos/neg
-    // are summed in the same order.
-    static int affineInverseScalar(const ZmMat4f& in, ZmMat4f& out) noexcept
-    {
-        const auto& a = in.m_m;
-        const float a00 = a[0][0], a01 = a[0][1], a02 = a[0][2];
-        const float a10 = a[1][0], a11 = a[1][1], a12 = a[1][2];
-        const float a20 = a[2][0], a21 = a[2][1], a22 = a[2][2];
-        // Signed products: three positive terms, three negative ones (negation is exact).
-        const double p0 = a00 * a11 * a22, p1 = a01 * a12 * a20, p2 = a02 * a10 * a21;
-        const double n0 = -(a02 * a11 * a20), n1 = -(a00 * a12 * a21), n2 = -(a01 * a10 * a22);
-        auto plus = [](double v) { return 0.0 > v ? 0.0 : v; };
-        auto minus = [](double v) { return 0.0 < v ? 0.0 : v; };
-        const double pos = ((plus(p0) + plus(n0)) + (plus(p2) + plus(n2))) + (plus(p1) + plus(n1));
-        const double neg = ((minus(p0) + minus(n0)) + (minus(p2) + minus(n2))) + (minus(p1) + minus(n1));
-        const double det = pos + neg;
-        // A zero block (pos = neg = 0) would give 0/0; it is as singular as it gets.
-        if (det == 0.0 || std::fabs(det / (pos - neg)) < 1e-15)
-            return 0;
-        const double inv = 1.0 / det;
-        auto adj = [inv](float p, float q) { return float((double(p) - double(q)) * inv); };
-        const float i00 = adj(a11 * a22, a12 * a21), i10 = adj(a12 * a20, a10 * a22),
-                    i20 = adj(a10 * a21, a11 * a20);
-        const float i01 = adj(a21 * a02, a22 * a01), i11 = adj(a22 * a00, a20 * a02),
-                    i21 = adj(a20 * a01, a21 * a00);
-        const float i02 = adj(a01 * a12, a02 * a11), i12 = adj(a02 * a10, a00 * a12),
-                    i22 = adj(a00 * a11, a01 * a10);
-        const float t0 = a[3][0], t1 = a[3][1], t2 = a[3][2];
-        out = ZmMat4f(i00, i01, i02, 0.0f, i10, i11, i12, 0.0f, i20, i21, i22, 0.0f,
-                      -(t0 * i00 + t1 * i10 + t2 * i20), -(t0 * i01 + t1 * i11 + t2 * i21),
-                      -(t0 * i02 + t1 * i12 + t2 * i22), 1.0f);
-        return 1;
-    }
-#if defined(__SSE2__)
+    // The columns of the upper inverse are the cross products of the rows (r1 x r2, r2 x r0,
+    // r0 x r1); the determinant's products are (r0 * r1.yzx) * r2.zxy and (r0.zxy * r1.yzx) * r2,
+    // with pos and neg summed ((p0, n0) + (p2, n2)) + (p1, n1).
     static int affineInverseSse2(const ZmMat4f& in, ZmMat4f& out) noexcept
     {
         const __m128 r0 = _mm_loadu_ps(in.m_m[0]), r1 = _mm_loadu_ps(in.m_m[1]), r2 = _mm_loadu_ps(in.m_m[2]);
@@ -364,14 +326,8 @@ private:
         _mm_storeu_ps(out.m_m[3], row3);
         return 1;
     }
-    static __m128 yzx(__m128 v) noexcept
-    {
-        return _mm_shuffle_ps(v, v, _MM_SHUFFLE(3, 0, 2, 1));
-    }
-    static __m128 zxy(__m128 v) noexcept
-    {
-        return _mm_shuffle_ps(v, v, _MM_SHUFFLE(3, 1, 0, 2));
-    }
+    static __m128 yzx(__m128 v) noexcept { return _mm_shuffle_ps(v, v, _MM_SHUFFLE(3, 0, 2, 1)); }
+    static __m128 zxy(__m128 v) noexcept { return _mm_shuffle_ps(v, v, _MM_SHUFFLE(3, 1, 0, 2)); }
     /// float((double(p) - double(q)) * inv) per lane.
     static __m128 adjugateColumn(__m128 p, __m128 q, __m128d inv) noexcept
     {
@@ -380,7 +336,6 @@ private:
             _mm_mul_pd(_mm_sub_pd(_mm_cvtps_pd(_mm_movehl_ps(p, p)), _mm_cvtps_pd(_mm_movehl_ps(q, q))), inv);
         return _mm_movelh_ps(_mm_cvtpd_ps(lo), _mm_cvtpd_ps(hi));
     }
-#endif
     /// out = a * b, each element summed k = 0..3 starting from 0.0f. \p out may be \p a or \p b.
     static void product(const ZmMat4f& a, const ZmMat4f& b, ZmMat4f& out) noexcept
     {

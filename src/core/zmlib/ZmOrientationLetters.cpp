@@ -1,6 +1,5 @@
 #include <zmlib/ZmOrientationLetters.h>
 
-#include <cmath>
 #include <cstring>
 
 namespace {
@@ -36,20 +35,6 @@ std::string opposite(const std::string& s)
     return r;
 }
 
-// Index of the largest of three magnitudes; a later one must be strictly greater, so ties go to
-// the lower axis.
-int largest(const float a[3])
-{
-    int i = 0;
-    if (a[1] > a[i]) {
-        i = 1;
-    }
-    if (a[2] > a[i]) {
-        i = 2;
-    }
-    return i;
-}
-
 // The letter of patient axis \p axis for a component of sign \p v.
 char letterOf(int axis, float v)
 {
@@ -67,14 +52,6 @@ ZmVec3f labelDirection(const std::string& label)
     return d;
 }
 
-ZmMat4f product(const ZmMat4f& a, const ZmMat4f& b, const ZmMat4f& c)
-{
-    ZmMat4f m(a);
-    m.multRight(b);
-    m.multRight(c);
-    return m;
-}
-
 } // namespace
 
 ZmOrientationLetters::ZmOrientationLetters() = default;
@@ -87,12 +64,10 @@ ZmOrientationLetters::ZmOrientationLetters(const ZmMat4f& m)
     used.multDirMatrix(ZmVec3f(1.0f, 0.0f, 0.0f), x);
     used.multDirMatrix(ZmVec3f(0.0f, 1.0f, 0.0f), y);
 
-    const float ax[3] = {std::fabs(x[0]), std::fabs(x[1]), std::fabs(x[2])};
-    const int xAxis = largest(ax);
+    // The largest magnitude picks the patient axis; on ties the lower axis (indexOfMax).
+    const int xAxis = x.abs().indexOfMax();
     // Screen y may not take the axis screen x took.
-    float ay[3] = {std::fabs(y[0]), std::fabs(y[1]), std::fabs(y[2])};
-    ay[xAxis] = 0.0f;
-    const int yAxis = largest(ay);
+    const int yAxis = y.abs().compSwapped(unsigned(xAxis), 0.0f).indexOfMax();
 
     m_right.assign(1, letterOf(xAxis, x[xAxis]));
     m_left.assign(1, opposite(m_right[0]));
@@ -101,7 +76,7 @@ ZmOrientationLetters::ZmOrientationLetters(const ZmMat4f& m)
 }
 
 ZmOrientationLetters::ZmOrientationLetters(const ZmMat4f& a, const ZmMat4f& b, const ZmMat4f& c)
-    : ZmOrientationLetters(product(a, b, c))
+    : ZmOrientationLetters(ZmMat4f(a).multRight(b).multRight(c))
 {}
 
 ZmOrientationLetters::ZmOrientationLetters(const std::string& right, const std::string& bottom)

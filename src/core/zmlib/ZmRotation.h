@@ -10,9 +10,7 @@
 #include <cmath>
 #include <string>
 
-#if defined(__SSE2__)
-#include <emmintrin.h>
-#endif
+#include <emmintrin.h> // SSE2: every x86-64 processor, the only target of this library
 
 /// A rotation as a unit quaternion of four floats stored x, y, z, w (vector part first, 16 bytes);
 /// the rotation of angle a about the unit axis n is (n * sin(a/2), cos(a/2)). Rotations act on
@@ -112,9 +110,11 @@ public:
     /// Composition: first this rotation, then \p q (the quaternion product q * this), normalised.
     ZmRotation& operator*=(const ZmRotation& q) noexcept
     {
-#if defined(__SSE2__)
-        // Lane by lane the same products and the same order of sums as the scalar form below
-        // (products commute exactly, and adding a negated term is exact subtraction).
+        // With this = (x, y, z, w) and q = (X, Y, Z, W), lane by lane:
+        //   x' = X w + x W + z Y - Z y,   y' = W y + w Y + x Z - X z,
+        //   z' = z W + Z w + X y - x Y,   w' = W w - X x - y Y - z Z,
+        // summed left to right (products commute exactly, adding a negated term is exact
+        // subtraction), then normalised.
         const __m128 a = _mm_loadu_ps(m_q), b = _mm_loadu_ps(q.m_q);
         const __m128 lane3 = _mm_set_ps(-0.0f, 0.0f, 0.0f, 0.0f); // sign bit of w only
         const __m128 t1 = _mm_mul_ps(_mm_shuffle_ps(a, a, _MM_SHUFFLE(3, 2, 1, 3)),
@@ -128,15 +128,6 @@ public:
         const __m128 r =
             _mm_sub_ps(_mm_add_ps(_mm_add_ps(t1, _mm_xor_ps(t2, lane3)), _mm_xor_ps(t3, lane3)), t4);
         storeNormalized(r);
-#else
-        const float x = m_q[0], y = m_q[1], z = m_q[2], w = m_q[3];
-        const float X = q.m_q[0], Y = q.m_q[1], Z = q.m_q[2], W = q.m_q[3];
-        m_q[0] = X * w + x * W + z * Y - Z * y;
-        m_q[1] = W * y + w * Y + x * Z - X * z;
-        m_q[2] = z * W + Z * w + X * y - x * Y;
-        m_q[3] = W * w - X * x - y * Y - z * Z;
-        normalize();
-#endif
         return *this;
     }
     /// \p v rotated (through the 4x4 matrix and `ZmMat4f::multVecMatrix`).
@@ -146,10 +137,7 @@ public:
         multVec(v, r);
         return r;
     }
-    ZmVec3f multVec(const ZmVec3f& v) const noexcept
-    {
-        return *this * v;
-    }
+    ZmVec3f multVec(const ZmVec3f& v) const noexcept { return *this * v; }
     /// \p out may be \p v.
     void multVec(const ZmVec3f& v, ZmVec3f& out) const noexcept
     {
@@ -187,24 +175,15 @@ public:
         m_q[3] = 1.0f;
         return *this;
     }
-    void makeNaN() noexcept
-    {
-        m_q[0] = m_q[1] = m_q[2] = m_q[3] = std::nanf("0");
-    }
+    void makeNaN() noexcept { m_q[0] = m_q[1] = m_q[2] = m_q[3] = std::nanf("0"); }
     bool isNumber() const noexcept
     {
         return !std::isnan(m_q[0]) && !std::isnan(m_q[1]) && !std::isnan(m_q[2]) && !std::isnan(m_q[3]);
     }
 
     /// Component \p i (0..3 for x, y, z, w), no check; writing does not normalise.
-    float& operator[](int i) noexcept
-    {
-        return m_q[i];
-    }
-    const float& operator[](int i) const noexcept
-    {
-        return m_q[i];
-    }
+    float& operator[](int i) noexcept { return m_q[i]; }
+    const float& operator[](int i) const noexcept { return m_q[i]; }
 
     /// `{"w":"…","x":"…","y":"…","z":"…"}` where, intended and relied upon by readers of this
     /// text, "w" carries the stored x, "x" the stored y, "y" the stored z and "z" the stored w.
@@ -217,19 +196,7 @@ private:
         return m_q[0] * m_q[0] + m_q[1] * m_q[1] + m_q[2] * m_q[2] + m_q[3] * m_q[3];
     }
     /// Divides by the square root of `norm()`, the reciprocal taken in double.
-    void normalize() noexcept
-    {
-#if defined(__SSE2__)
-        storeNormalized(_mm_loadu_ps(m_q));
-#else
-        const double inv = 1.0 / std::sqrt(double(norm()));
-        m_q[0] = float(m_q[0] * inv);
-        m_q[1] = float(m_q[1] * inv);
-        m_q[2] = float(m_q[2] * inv);
-        m_q[3] = float(m_q[3] * inv);
-#endif
-    }
-#if defined(__SSE2__)
+    void normalize() noexcept { storeNormalized(_mm_loadu_ps(m_q)); }
     /// Stores \p v divided by its length: the squared norm summed in float in the order x, y, z,
     /// w (as `norm()`), its square root and reciprocal in double, each product rounded to float.
     void storeNormalized(__m128 v) noexcept
@@ -246,7 +213,6 @@ private:
         const __m128 hi = _mm_cvtpd_ps(_mm_mul_pd(_mm_cvtps_pd(_mm_movehl_ps(v, v)), inv));
         _mm_storeu_ps(m_q, _mm_movelh_ps(lo, hi));
     }
-#endif
 
     float m_q[4];
 };

@@ -8,7 +8,7 @@ static_assert(sizeof(ZmSphere) == 16, "ZmSphere layout");
 
 void ZmSphere::circumscribe(const ZmBox3f& box) noexcept
 {
-    if (box.xmin() > box.xmax() || box.ymin() > box.ymax() || box.zmin() > box.zmax()) {
+    if (box.isEmpty()) {
         setValue(ZmVec3f(0.0f), -1.0f);
         return;
     }
