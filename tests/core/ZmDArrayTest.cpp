@@ -7,7 +7,6 @@
 #include <algorithm>
 #include <cstdint>
 #include <cstdlib>
-#include <cstring>
 #include <initializer_list>
 #include <random>
 #include <string>
@@ -43,12 +42,12 @@ int compareInts(const int& a, const int& b)
 /// was constructed, or constructed over a live object shows up in the counters.
 struct Counted {
     static constexpr unsigned kAlive = 0xA11FEu;
-    inline static int64_t constructed = 0, destroyed = 0, copies = 0, errors = 0;
+    inline static int64_t constructed = 0, destroyed = 0, errors = 0;
     inline static Ints copyLog;
 
     static void reset()
     {
-        constructed = destroyed = copies = errors = 0;
+        constructed = destroyed = errors = 0;
         copyLog.clear();
     }
     static int64_t live() { return constructed - destroyed; }
@@ -60,7 +59,6 @@ struct Counted {
     {
         check(o);
         ++constructed;
-        ++copies;
         copyLog.push_back(o.value);
     }
     Counted& operator=(const Counted& o)
@@ -82,53 +80,31 @@ struct Counted {
     unsigned magic = kAlive;
 };
 
-// Element adapters for the random program: every element stands for an int of the model.
-template <class T>
-struct Elem;
-template <>
-struct Elem<int> {
-    static int make(int v) { return v; }
+// Every element of the random program stands for an int of the model.
+struct Elem {
+    template <class T>
+    static T make(int v)
+    {
+        if constexpr (std::is_same_v<T, ZmString>) {
+            return ZmString(0, "v%d", v);
+        } else {
+            return T(v);
+        }
+    }
     static int value(int v) { return v; }
-};
-template <>
-struct Elem<ZmString> {
-    static ZmString make(int v) { return ZmString(0, "v%d", v); }
+    static int value(const Counted& c) { return c.value; }
     static int value(const ZmString& s)
     {
         return s.getString()[0] == 'v' ? std::atoi(s.getString() + 1) : -1;
     }
-    static bool isDefault(const ZmString& s) { return s.size() == 1 && s.getString()[0] == 0; }
-};
-template <>
-struct Elem<Counted> {
-    static Counted make(int v) { return Counted(v); }
-    static int value(const Counted& c) { return c.value; }
     static bool isDefault(const Counted& c) { return c.value == -1 && c.magic == Counted::kAlive; }
+    static bool isDefault(const ZmString& s) { return s.size() == 1 && s.getString()[0] == 0; }
 };
 
 template <class T>
 int compareByValue(const T& a, const T& b)
 {
-    return compareInts(Elem<T>::value(a), Elem<T>::value(b));
-}
-
-template <class T>
-::testing::AssertionResult matches(const ZmDArray<T>& a, const Ints& model, int64_t max)
-{
-    if (a.size() != int64_t(model.size()) || (max >= 0 && a.getMax() != max)) {
-        return ::testing::AssertionFailure() << "size " << a.size() << ", capacity " << a.getMax()
-                                             << "; model " << model.size() << ", " << max;
-    }
-    if (!a.isConsistent() || (a.getMax() == 0) != (a.dataPtr() == nullptr)) {
-        return ::testing::AssertionFailure() << "inconsistent: capacity " << a.getMax();
-    }
-    for (size_t i = 0; i < model.size(); ++i) {
-        if (Elem<T>::value(a[i]) != model[i]) {
-            return ::testing::AssertionFailure()
-                   << "element " << i << " is " << Elem<T>::value(a[i]) << ", model " << model[i];
-        }
-    }
-    return ::testing::AssertionSuccess();
+    return compareInts(Elem::value(a), Elem::value(b));
 }
 
 /// A random sequence of operations on a ZmDArray<T>, checked after every step against a
@@ -143,13 +119,19 @@ public:
         for (int step = 0; step < steps; ++step) {
             const int64_t prevMax = m_a.getMax();
             const std::string op = doStep();
-            ASSERT_TRUE(matches(m_a, m_m, m_max)) << "step " << step << " after " << op;
-            ASSERT_TRUE(matches(m_s, m_sm, -1)) << "step " << step << " after " << op;
+            ASSERT_EQ(m_a.size(), size()) << "step " << step << " after " << op;
+            const ZmDArray<T>& a = m_a;
+            Ints values;
+            for (size_t i = 0; i < m_m.size(); ++i) {
+                values.push_back(Elem::value(a[i]));
+            }
+            ASSERT_EQ(values, m_m) << "step " << step << " after " << op;
+            ASSERT_EQ(m_a.getMax(), m_max) << "step " << step << " after " << op;
+            ASSERT_TRUE(m_a.isConsistent() && (m_max == 0) == (m_a.dataPtr() == nullptr)) << "step " << step;
             // Only remax gives capacity back; a move replaces the block altogether.
-            ASSERT_TRUE(m_a.getMax() >= prevMax || op == "remax" || op == "move=")
-                << "step " << step << " " << op;
+            ASSERT_TRUE(m_a.getMax() >= prevMax || op == "remax" || op == "move=") << "step " << step;
             if constexpr (std::is_same_v<T, Counted>) {
-                ASSERT_EQ(Counted::live(), m_a.size() + m_s.size()) << "step " << step << " after " << op;
+                ASSERT_EQ(Counted::live(), m_a.size()) << "step " << step << " after " << op;
                 ASSERT_EQ(Counted::errors, 0) << "step " << step << " after " << op;
             }
         }
@@ -169,7 +151,7 @@ private:
     {
         ZmDArray<T> r;
         for (int v : values) {
-            r.append(Elem<T>::make(v));
+            r.append(Elem::make<T>(v));
         }
         return r;
     }
@@ -192,10 +174,10 @@ private:
     {
         for (int64_t i = from; i < to; ++i) {
             if constexpr (!std::is_same_v<T, int>) {
-                EXPECT_TRUE(Elem<T>::isDefault(m_a[i])) << "slot " << i << " not default-constructed";
+                EXPECT_TRUE(Elem::isDefault(m_a[i])) << "slot " << i << " not default-constructed";
             }
             m_m[size_t(i)] = value();
-            m_a[i] = Elem<T>::make(m_m[size_t(i)]);
+            m_a[i] = Elem::make<T>(m_m[size_t(i)]);
         }
     }
     void eraseValue(int v) { m_m.erase(std::remove(m_m.begin(), m_m.end(), v), m_m.end()); }
@@ -203,21 +185,21 @@ private:
     const char* doStep()
     {
         const int64_t n = size();
-        switch (n > 250 ? -1 : pick(24)) {
+        switch (n > 250 ? -1 : pick(22)) {
         case -1:
             m_a.remove(0, n / 2);
             m_m.erase(m_m.begin(), m_m.begin() + n / 2);
             return "trim";
         case 0: {
             const int v = value();
-            EXPECT_EQ(m_a.append(Elem<T>::make(v)), n);
+            EXPECT_EQ(m_a.append(Elem::make<T>(v)), n);
             insertModel(n, {v});
             return "append";
         }
         case 1: {
             const int64_t pos = pick(n + 1);
             const int v = value();
-            m_a.insert(pos, Elem<T>::make(v));
+            m_a.insert(pos, Elem::make<T>(v));
             insertModel(pos, {v});
             return "insert";
         }
@@ -262,9 +244,9 @@ private:
             return "removeLast";
         }
         case 7: {
-            T out = Elem<T>::make(999); // untouched when the array is empty
+            T out = Elem::make<T>(999); // untouched when the array is empty
             EXPECT_EQ(m_a.pop(out), n == 0 ? 0 : 1);
-            EXPECT_EQ(Elem<T>::value(out), n == 0 ? 999 : m_m.back());
+            EXPECT_EQ(Elem::value(out), n == 0 ? 999 : m_m.back());
             m_a.pop_back();
             m_m.resize(size_t(std::max<int64_t>(n - 2, 0)));
             return "pop, pop_back";
@@ -298,19 +280,17 @@ private:
             std::rotate(m_m.begin(), by < 0 ? m_m.begin() - by : m_m.end() - by, m_m.end());
             return "rotate";
         }
-        case 12:
+        case 12: {
             m_a.reverse();
             std::reverse(m_m.begin(), m_m.end());
-            return "reverse";
-        case 13: {
             const int64_t i = pick(n), j = pick(n);
             if (n > 0) {
                 m_a.swap(i, j);
                 std::swap(m_m[size_t(i)], m_m[size_t(j)]);
             }
-            return "swap";
+            return "reverse, swap";
         }
-        case 14: {
+        case 13: {
             const Ints values = randomValues(6);
             m_a.join(arrayOf(values));
             m_a.join(m_a);
@@ -321,16 +301,16 @@ private:
             }
             return "join";
         }
-        case 15: { // the value is sometimes one of the array's own elements
+        case 14: { // the value is sometimes one of the array's own elements
             const int64_t k = pick(n);
             const bool own = n > 0 && pick(2) == 0;
             const int v = own ? m_m[size_t(k)] : value();
-            const int64_t removed = own ? m_a.removeValue(m_a[k]) : m_a.removeValue(Elem<T>::make(v));
+            const int64_t removed = own ? m_a.removeValue(m_a[k]) : m_a.removeValue(Elem::make<T>(v));
             EXPECT_EQ(removed, std::count(m_m.begin(), m_m.end(), v));
             eraseValue(v);
             return "removeValue";
         }
-        case 16: {
+        case 15: {
             const Ints values = randomValues(4);
             m_a.subtract(arrayOf(values));
             std::for_each(values.begin(), values.end(), [this](int v) { eraseValue(v); });
@@ -340,11 +320,7 @@ private:
             }
             return "subtract";
         }
-        case 17:
-            m_a.sort(compareByValue<T>);
-            std::sort(m_m.begin(), m_m.end());
-            return "sort";
-        case 18: {
+        case 16: {
             if (pick(4) != 0) {
                 return "noop";
             }
@@ -356,7 +332,7 @@ private:
             fillNew(std::min(n, ns), ns);
             return "remax";
         }
-        case 19: {
+        case 17: {
             const Ints values = randomValues(n + 12);
             const ZmDArray<T> copy(m_a), other = arrayOf(values);
             EXPECT_EQ(copy.getMax(), n);
@@ -366,7 +342,7 @@ private:
             m_m = values;
             return "copy=";
         }
-        case 20: {
+        case 18: {
             const Ints values = randomValues(n + 12);
             ZmDArray<T> other = arrayOf(values);
             ZmDArray<T> copy(other);
@@ -375,42 +351,42 @@ private:
             m_m = values;
             return "move=";
         }
-        case 21:
+        case 19:
             if (pick(8) == 0) {
                 m_a.clear();
                 m_m.clear();
             }
             return "clear";
-        case 22: {
+        case 20: {
             const int v = value();
             const auto it = std::find(m_m.begin(), m_m.end(), v);
-            EXPECT_EQ(m_a.index(Elem<T>::make(v)), it == m_m.end() ? -1 : it - m_m.begin());
-            EXPECT_EQ(m_a.contains(Elem<T>::make(v)), it != m_m.end());
+            EXPECT_EQ(m_a.index(Elem::make<T>(v)), it == m_m.end() ? -1 : it - m_m.begin());
+            EXPECT_EQ(m_a.contains(Elem::make<T>(v)), it != m_m.end());
             ZmDArray<T> other(0, n + 7); // equal content, different capacity
             other.appendArray(m_a);
             EXPECT_TRUE(other == m_a && !(other != m_a));
             if (n > 0) {
-                other.last() = Elem<T>::make(m_m.back() + 1);
+                other.last() = Elem::make<T>(m_m.back() + 1);
                 EXPECT_TRUE(other != m_a && !(other == m_a));
             }
             return "queries";
         }
         default: {
-            if (m_sm.size() > 150) {
-                m_s.clear();
-                m_sm.clear();
-            }
+            // Sorted, the array takes bisection: with only 20 values ties are frequent, and a new
+            // element must land after every equal one.
+            m_a.sort(compareByValue<T>);
+            std::sort(m_m.begin(), m_m.end());
             const int v = value(), probe = value();
-            const auto upper = std::upper_bound(m_sm.begin(), m_sm.end(), v) - m_sm.begin();
-            EXPECT_EQ(m_s.insertSorted(Elem<T>::make(v), compareByValue<T>), upper);
-            m_sm.insert(m_sm.begin() + upper, v);
-            const int64_t found = m_s.findSorted(Elem<T>::make(probe), compareByValue<T>);
-            if (std::binary_search(m_sm.begin(), m_sm.end(), probe)) {
-                EXPECT_TRUE(found >= 0 && m_sm[size_t(found)] == probe) << "findSorted " << probe;
+            const auto upper = std::upper_bound(m_m.begin(), m_m.end(), v) - m_m.begin();
+            EXPECT_EQ(m_a.insertSorted(Elem::make<T>(v), compareByValue<T>), upper);
+            insertModel(upper, {v});
+            const int64_t found = m_a.findSorted(Elem::make<T>(probe), compareByValue<T>);
+            if (std::binary_search(m_m.begin(), m_m.end(), probe)) {
+                EXPECT_TRUE(found >= 0 && m_m[size_t(found)] == probe) << "findSorted " << probe;
             } else {
                 EXPECT_EQ(found, -1) << "findSorted " << probe;
             }
-            return "insertSorted, findSorted";
+            return "sort, insertSorted, findSorted";
         }
         }
     }
@@ -419,13 +395,9 @@ private:
     ZmDArray<T> m_a;
     Ints m_m;
     int64_t m_max = 0;
-    ZmDArray<T> m_s; // kept sorted through insertSorted
-    Ints m_sm;
 };
 
 } // namespace
-
-// --- capacity ------------------------------------------------------------------------------------
 
 TEST(ZmDArray, GrowthIsOneAndAHalfOfSize)
 {
@@ -449,13 +421,6 @@ TEST(ZmDArray, GrowthIsOneAndAHalfOfSize)
     EXPECT_EQ(b.getMax(), 22); // max(3, 22)
     b.push_back(1);
     EXPECT_EQ(b.getMax(), 33); // max(33, 23)
-    IntArray c(10, 10);
-    c.insert(0, 5);
-    EXPECT_EQ(c.getMax(), 15);
-    c.insert(3, 8, twenty.data()); // size 11 needs 19: max(16, 19)
-    EXPECT_EQ(c.getMax(), 19);
-    EXPECT_EQ(c.size(), 19);
-    EXPECT_EQ(c[0] + c[3] + c[10], 5 + 7 + 7);
 }
 
 TEST(ZmDArray, ResizeRemaxAndConstructorCapacityRules)
@@ -473,14 +438,6 @@ TEST(ZmDArray, ResizeRemaxAndConstructorCapacityRules)
     EXPECT_EQ(a.resize(-5), 0);
     EXPECT_EQ(a.getMax(), 10);
     EXPECT_EQ(a.dataPtr(), block);
-    a.resize(4);
-    a.resize(11);
-    EXPECT_EQ(a.getMax(), 11); // max(trunc(4 * 1.5), 11)
-    a.resize(12);
-    EXPECT_EQ(a.getMax(), 16); // max(trunc(11 * 1.5), 12)
-    a.resize(3);
-    a.clear();
-    EXPECT_EQ(a.getMax(), 16);
     a.removeLast(2); // deliberately unchecked: the size goes negative
     EXPECT_EQ(a.size(), -2);
 
@@ -488,17 +445,11 @@ TEST(ZmDArray, ResizeRemaxAndConstructorCapacityRules)
     EXPECT_EQ(r.getMax(), 6);
     EXPECT_EQ(r.remax(-1, -1), 1);
     EXPECT_EQ(r.getMax(), 5);
-    EXPECT_EQ(r.remax(20, -1), -15);
-    EXPECT_EQ(contents(r), (Ints{1, 2, 3, 4, 5}));
-    EXPECT_EQ(r.remax(2, 3), 17); // the capacity never falls below the new size
-    EXPECT_EQ(r.getMax(), 3);
+    EXPECT_EQ(r.remax(2, 3), 2); // the capacity never falls below the new size
     EXPECT_EQ(contents(r), (Ints{1, 2, 3}));
     EXPECT_EQ(r.remax(0, 0), 3);
     EXPECT_EQ(r.dataPtr(), nullptr);
-    EXPECT_EQ(r.remax(0, 0), 0);
 }
-
-// --- ownership -----------------------------------------------------------------------------------
 
 TEST(ZmDArray, CopiesMovesAndSwapsOwnTheRightBlock)
 {
@@ -509,14 +460,9 @@ TEST(ZmDArray, CopiesMovesAndSwapsOwnTheRightBlock)
     EXPECT_EQ(a[0], 1);
     const IntArray empty;
     EXPECT_EQ(IntArray(empty).dataPtr(), nullptr);
-    IntArray small(2, 2), large(0, 50);
-    small = a;
-    large = a;
-    EXPECT_EQ(small.getMax(), 5);
-    EXPECT_EQ(large.getMax(), 50);
-    IntArray& alias = large;
-    large = alias;
-    EXPECT_EQ(contents(large), contents(a));
+    IntArray& alias = b;
+    b = alias;
+    EXPECT_EQ(contents(b), (Ints{99, 2, 3, 4, 5}));
 
     int* block = a.dataPtr();
     IntArray moved(std::move(a));
@@ -555,8 +501,6 @@ TEST(ZmDArray, ReleaseAndSetRawDataHandOverBlocksWithoutFreeing)
     EXPECT_EQ(b.getMax(), 4);
 }
 
-// --- adding from itself --------------------------------------------------------------------------
-
 TEST(ZmDArray, AddingItsOwnElementsSurvivesReallocation)
 {
     IntArray a = makeInts({0, 1, 2, 3});
@@ -571,12 +515,13 @@ TEST(ZmDArray, AddingItsOwnElementsSurvivesReallocation)
     s.append(s[1]);
     EXPECT_STREQ(s[4].getString(), "string number 1, long enough to live on the heap");
 
+    // Every source range of a full array (so that the block moves) at every insertion point.
     const Ints base = {10, 11, 12, 13, 14, 15};
     for (int64_t pos = 0; pos <= 6; ++pos) {
         for (int64_t k = 0; k < 6; ++k) {
             for (int64_t n = 1; k + n <= 6; ++n) {
                 IntArray full;
-                full.append(6, base.data()); // capacity 6: the insertion reallocates
+                full.append(6, base.data());
                 full.insert(pos, n, full.dataPtr() + k);
                 Ints model = base;
                 model.insert(model.begin() + pos, base.begin() + k, base.begin() + k + n);
@@ -590,56 +535,41 @@ TEST(ZmDArray, AddingItsOwnElementsSurvivesReallocation)
     EXPECT_EQ(contents(b), (Ints{1, 2, 1, 2, 3, 1, 2, 3, 3, 1, 2, 3}));
 }
 
-// --- bisection -----------------------------------------------------------------------------------
-
-TEST(ZmDArray, BisectionOnEmptyArrayCallsNoComparison)
+TEST(ZmDArray, BisectionBoundsEmptyArrayAndStableTies)
 {
+    // An empty array is answered without calling the comparison.
     static int calls = 0;
     const auto counting = [](const int& x, const int& y) {
         ++calls;
         return compareInts(x, y);
     };
-    IntArray a;
-    EXPECT_EQ(a.findSorted(5, counting), -1);
-    EXPECT_EQ(a.insertSorted(5, counting), 0);
+    IntArray e;
+    EXPECT_EQ(e.findSorted(5, counting), -1);
+    EXPECT_EQ(e.insertSorted(5, counting), 0);
     EXPECT_EQ(calls, 0);
-    EXPECT_EQ(contents(a), (Ints{5}));
-}
+    EXPECT_EQ(contents(e), (Ints{5}));
 
-TEST(ZmDArray, InsertSortedPlacesTiesAfterEqualElements)
-{
-    struct Keyed {
-        int key, tag;
-    };
-    ZmDArray<Keyed> a;
-    const int keys[] = {3, 1, 3, 2, 3, 1, 2, 3};
-    std::vector<std::pair<int, int>> model; // (key, tag): tags grow, so pair order is stable order
-    for (int tag = 0; tag < 8; ++tag) {
-        const auto at =
-            std::upper_bound(model.begin(), model.end(), std::make_pair(keys[tag], 99)) - model.begin();
-        EXPECT_EQ(a.insertSorted({keys[tag], tag},
-                                 [](const Keyed& x, const Keyed& y) { return compareInts(x.key, y.key); }),
-                  at);
-        model.insert(model.begin() + at, {keys[tag], tag});
-    }
-    for (int i = 0; i < 8; ++i) {
-        EXPECT_EQ(std::make_pair(a[i].key, a[i].tag), model[size_t(i)]) << i;
-    }
-}
-
-TEST(ZmDArray, FindSortedHonoursItsBounds)
-{
     const IntArray a = makeInts({1, 2, 3, 4, 5, 6});
-    for (int v = 0; v <= 7; ++v) {
-        EXPECT_EQ(a.findSorted(v, compareInts), v >= 1 && v <= 6 ? v - 1 : -1) << v;
-    }
     EXPECT_EQ(a.findSorted(2, compareInts, 2, -1), -1); // lo is exclusive: index 1 is outside
     EXPECT_EQ(a.findSorted(5, compareInts, 2, -1), 4);
     EXPECT_EQ(a.findSorted(6, compareInts, -1, 3), -1);
     EXPECT_EQ(a.findSorted(4, compareInts, -1, 3), 3); // the final test looks at hi itself
-}
 
-// --- ordering and set operations -----------------------------------------------------------------
+    // A new element goes after every element comparing equal: the tags show the order.
+    struct Keyed {
+        int key, tag;
+    };
+    ZmDArray<Keyed> k;
+    const auto byKey = [](const Keyed& x, const Keyed& y) { return compareInts(x.key, y.key); };
+    for (const Keyed& v : {Keyed{3, 0}, Keyed{1, 1}, Keyed{3, 2}, Keyed{1, 3}, Keyed{3, 4}}) {
+        k.insertSorted(v, byKey);
+    }
+    std::string order;
+    for (const Keyed& v : k) {
+        order += std::to_string(v.key) + ":" + std::to_string(v.tag) + " ";
+    }
+    EXPECT_EQ(order, "1:1 1:3 3:0 3:2 3:4 ");
+}
 
 TEST(ZmDArray, ReorderingAndSetOperationsOnKnownInputs)
 {
@@ -649,14 +579,6 @@ TEST(ZmDArray, ReorderingAndSetOperationsOnKnownInputs)
     a = makeInts({1, 2, 3});
     a.rotate(1);
     EXPECT_EQ(contents(a), (Ints{3, 1, 2}));
-    a = makeInts({1, 2, 3, 4, 5});
-    a.rotate(-2);
-    EXPECT_EQ(contents(a), (Ints{3, 4, 5, 1, 2}));
-    a.rotate(5);
-    a.reverse();
-    a.swap(0, 3);
-    a.swap(2, 2);
-    EXPECT_EQ(contents(a), (Ints{4, 1, 5, 2, 3}));
 
     ZmDArray<char> set;
     set.append('a');
@@ -672,28 +594,18 @@ TEST(ZmDArray, ReorderingAndSetOperationsOnKnownInputs)
     a = makeInts({1, 2, 2, 3, 2, 4});
     a.subtract(makeInts({2, 8}));
     EXPECT_EQ(contents(a), (Ints{1, 3, 4}));
-    EXPECT_EQ(a.getMax(), max);
+    EXPECT_EQ(a.getMax(), max); // removal releases nothing
 
-    IntArray b(0, 10);
-    EXPECT_TRUE(IntArray() == b); // empty arrays are equal whatever their capacities
-    b.append(3, a.dataPtr());
-    EXPECT_TRUE(a == b);
-    b[2] = 5;
-    EXPECT_TRUE(a != b);
-}
+    EXPECT_TRUE(IntArray() == IntArray(0, 10)); // empty arrays are equal whatever their capacities
+    IntArray prefix = makeInts({1, 2});
+    prefix.pop_back(); // the 2 stays in the block, past the size
+    EXPECT_TRUE(makeInts({1, 2}) != prefix);
 
-TEST(ZmDArray, RotateOfAnUnallocatedArrayIsANoOp)
-{
     // k = 0 does not exceed the size 0; under UBSan a null block must not reach the byte copies.
     IntArray never;
     never.rotate(0);
-    IntArray emptied = makeInts({1, 2});
-    emptied.remax(0, 0);
-    emptied.rotate(0);
-    EXPECT_EQ(never.size() + emptied.size(), 0);
+    EXPECT_EQ(never.size(), 0);
 }
-
-// --- element lifetime ----------------------------------------------------------------------------
 
 TEST(ZmDArray, ClassElementsAreCopiedInPlaceAndRelocatedWithoutCopies)
 {
@@ -728,30 +640,21 @@ TEST(ZmDArray, ClassElementsAreCopiedInPlaceAndRelocatedWithoutCopies)
     EXPECT_EQ(Counted::errors, 0);
 }
 
-// --- random programs against a std::vector model (ASan/LSan watch the element blocks) -------------
-
-TEST(ZmDArray, RandomProgramOfIntsMatchesVectorModel)
+// The random programs run with ASan/LSan watching every element block.
+TEST(ZmDArray, RandomProgramsMatchVectorModelAndKeepLifetimesExact)
 {
     for (uint32_t seed : {1u, 2u, 3u, 4u, 5u}) {
         RandomProgram<int>(seed).run(4000);
-        ASSERT_FALSE(HasFatalFailure()) << "seed " << seed;
+        ASSERT_FALSE(HasFatalFailure()) << "int, seed " << seed;
     }
-}
-
-TEST(ZmDArray, RandomProgramOfStringsMatchesVectorModel)
-{
     for (uint32_t seed : {11u, 12u, 13u}) {
         RandomProgram<ZmString>(seed).run(2000);
-        ASSERT_FALSE(HasFatalFailure()) << "seed " << seed;
+        ASSERT_FALSE(HasFatalFailure()) << "ZmString, seed " << seed;
     }
-}
-
-TEST(ZmDArray, RandomProgramOfCountedElementsKeepsLifetimesExact)
-{
     for (uint32_t seed : {21u, 22u, 23u}) {
         Counted::reset();
         RandomProgram<Counted>(seed).run(2000);
-        ASSERT_FALSE(HasFatalFailure()) << "seed " << seed;
+        ASSERT_FALSE(HasFatalFailure()) << "Counted, seed " << seed;
         EXPECT_EQ(Counted::constructed, Counted::destroyed) << "seed " << seed;
         EXPECT_EQ(Counted::errors, 0) << "seed " << seed;
     }

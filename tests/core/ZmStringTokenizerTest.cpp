@@ -46,9 +46,8 @@ Tokens stdTokens(const std::string& s, const char* delims)
     ZmStdStringTokenizer t(s, delims);
     Tokens out;
     while (t.hasMoreTokens()) {
-        std::string tok;
-        t.nextToken(tok);
-        out.push_back(tok);
+        out.emplace_back();
+        t.nextToken(out.back());
     }
     return out;
 }
@@ -63,62 +62,40 @@ bool isWhite(char c)
 
 // --- ZmStringTokenizer -----------------------------------------------------------------------
 
-TEST(ZmStringTokenizer, SplitsOnWhiteSpaceAndSkipsItAtBothEnds)
+// Splitting plain white-space separated text is PropertyJoinedTokensComeBack's.
+TEST(ZmStringTokenizer, EscapesAndQuotes)
 {
-    EXPECT_EQ(tokens("a b"), (Tokens{"a", "b"}));
-    EXPECT_EQ(tokens(" \t a \n\v\f\r bc  "), (Tokens{"a", "bc"}));
-    EXPECT_EQ(tokens(""), Tokens{});
-    EXPECT_EQ(tokens(" \t\n "), Tokens{});
-    EXPECT_EQ(tokens("\xa0x\x85"), (Tokens{"\xa0x\x85"})); // not white space in the C locale
-
-    ZmStringTokenizer t("one  ");
-    EXPECT_TRUE(t.hasMoreTokens());
-    EXPECT_EQ(text(t.nextToken()), "one");
-    EXPECT_FALSE(t.hasMoreTokens());    // only delimiters were left
-    EXPECT_EQ(text(t.nextToken()), ""); // exhausted: an empty token
-    EXPECT_FALSE(t.hasMoreTokens());
+    const struct {
+        const char* text;
+        Tokens expected;
+    } cases[] = {
+        {"a b\\ c", {"a", "b c"}}, // a backslash takes the next byte as it is
+        {"a\\\\b", {"a\\b"}},
+        {"a\\\"b c", {"a\"b", "c"}},
+        {"\\x\\y", {"xy"}},
+        {"ab\\", {"ab"}},                // a trailing backslash escapes nothing
+        {"ab\"c d\"e", {"abc de"}},      // quotes start anywhere and keep delimiters
+        {"x \"y \\ z", {"x", "y \\ z"}}, // unclosed: runs to the end, no escapes
+        {"\"\" \"\"", {"", ""}},
+        {"\"a\"\"b\"", {"ab"}},
+        {"\"a\"b c", {"ab", "c"}},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(tokens(c.text), c.expected) << "'" << c.text << "'";
+    }
 }
 
-TEST(ZmStringTokenizer, BackslashEscapesTheNextByte)
-{
-    EXPECT_EQ(tokens("a b\\ c"), (Tokens{"a", "b c"}));
-    EXPECT_EQ(tokens("a\\\\b"), (Tokens{"a\\b"}));
-    EXPECT_EQ(tokens("a\\\"b c"), (Tokens{"a\"b", "c"}));
-    EXPECT_EQ(tokens("\\x\\y"), (Tokens{"xy"}));
-    EXPECT_EQ(tokens("ab\\"), (Tokens{"ab"})); // a trailing backslash escapes nothing
-    EXPECT_EQ(tokens("\\ "), (Tokens{" "}));
-}
-
-TEST(ZmStringTokenizer, QuotesStartAnywhereAndKeepDelimiters)
-{
-    EXPECT_EQ(tokens("ab\"c d\"e"), (Tokens{"abc de"}));
-    EXPECT_EQ(tokens("\"a  b\"  c"), (Tokens{"a  b", "c"}));
-    EXPECT_EQ(tokens("x \"y \\ z"), (Tokens{"x", "y \\ z"})); // unclosed: runs to the end, no escapes
-    EXPECT_EQ(tokens("\"\""), (Tokens{""}));
-    EXPECT_EQ(tokens("\"\" \"\""), (Tokens{"", ""}));
-    EXPECT_EQ(tokens("a\"\"b"), (Tokens{"ab"}));
-    EXPECT_EQ(tokens("\"a\"\"b\""), (Tokens{"ab"}));
-    EXPECT_EQ(tokens("\"a\"b c"), (Tokens{"ab", "c"}));
-}
-
-TEST(ZmStringTokenizer, OverAZmStringReadsItsWholeLength)
+TEST(ZmStringTokenizer, ReadsAZmStringToItsLengthAndRetargetsKeepingTheToken)
 {
     const ZmString s("a\0b c", 0, 5);
-    ZmStringTokenizer t(s);
-    EXPECT_EQ(drain(t), (Tokens{std::string("a\0b", 3), "c"}));
-}
+    ZmStringTokenizer z(s);
+    EXPECT_EQ(drain(z), (Tokens{std::string("a\0b", 3), "c"}));
 
-TEST(ZmStringTokenizer, RetargetingKeepsTheCurrentTokenUntilTheNextCall)
-{
     ZmStringTokenizer t("first rest");
     ZmString& token = t.nextToken();
-    EXPECT_EQ(text(token), "first");
     t = "   x y";
     EXPECT_EQ(text(token), "first");
-    EXPECT_TRUE(t.hasMoreTokens());
-    EXPECT_EQ(text(t.nextToken()), "x");
-    EXPECT_EQ(text(t.nextToken()), "y");
-    EXPECT_FALSE(t.hasMoreTokens());
+    EXPECT_EQ(drain(t), (Tokens{"x", "y"}));
     t = "  ";
     EXPECT_FALSE(t.hasMoreTokens());
     t = "z";
@@ -135,51 +112,35 @@ TEST(ZmStringTokenizer, NextIntAndNextFloatConvertTokens)
     EXPECT_EQ(t.nextInt(), 0);
     EXPECT_EQ(t.nextInt(), 7);
     EXPECT_FALSE(t.hasMoreTokens());
-    EXPECT_EQ(t.nextInt(), 0);
+    EXPECT_EQ(text(t.nextToken()), ""); // exhausted: an empty token
+    EXPECT_FALSE(t.hasMoreTokens());
 }
 
 // --- ZmStringTokenizerGeneral ----------------------------------------------------------------
 
+// Runs of delimiters and the skip before the first token are PropertyJoinedTokensComeBack's.
 TEST(ZmStringTokenizerGeneral, SplitsOnTheGivenSetOnly)
 {
-    EXPECT_EQ(tokens("a,b;;c", ",;"), (Tokens{"a", "b", "c"}));
-    EXPECT_EQ(tokens("a b,c d", ","), (Tokens{"a b", "c d"})); // blanks are ordinary bytes now
-    EXPECT_EQ(tokens("a\xff"
-                     "b\x80\x80"
-                     "c",
-                     "\xff\x80"),
-              (Tokens{"a", "b", "c"}));
-    EXPECT_EQ(tokens("\x7f"
-                     "a\x7f",
-                     "\x7f"),
-              (Tokens{"a"}));
-    EXPECT_EQ(tokens("a b", ""), (Tokens{"a b"}));
-    EXPECT_EQ(tokens("  ", ","), (Tokens{"  "}));
-}
-
-TEST(ZmStringTokenizerGeneral, QuotesAndEscapesStillApply)
-{
-    EXPECT_EQ(tokens("\"a,b\",c", ","), (Tokens{"a,b", "c"}));
-    EXPECT_EQ(tokens("a\\,b,c", ","), (Tokens{"a,b", "c"}));
-    EXPECT_EQ(tokens("x,\"y", ","), (Tokens{"x", "y"}));
-}
-
-TEST(ZmStringTokenizerGeneral, InitialSkipUsesTheSet)
-{
-    ZmStringTokenizerGeneral t(",,;a", ",;");
-    EXPECT_TRUE(t.hasMoreTokens());
-    EXPECT_EQ(text(t.nextToken()), "a");
-    EXPECT_FALSE(t.hasMoreTokens());
-
-    ZmStringTokenizerGeneral onlyDelims(",,,", ",");
-    EXPECT_FALSE(onlyDelims.hasMoreTokens());
+    const struct {
+        const char* text;
+        const char* delims;
+        Tokens expected;
+    } cases[] = {
+        {" a b, c d ", ",", {" a b", " c d "}},                       // blanks are ordinary bytes now
+        {"\177a\377b\200\200c\177", "\377\200\177", {"a", "b", "c"}}, // bytes of either sign
+        {"a b", "", {"a b"}},
+        {"\"a,b\",c", ",", {"a,b", "c"}}, // quotes and escapes still apply
+        {"a\\,b,c", ",", {"a,b", "c"}},
+        {"x,\"y", ",", {"x", "y"}},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(tokens(c.text, c.delims), c.expected) << "'" << c.text << "' split at '" << c.delims << "'";
+    }
 
     const ZmString s(";x;y;");
     ZmStringTokenizerGeneral fromString(s, ";");
     EXPECT_EQ(drain(fromString), (Tokens{"x", "y"}));
-
-    // Re-targeting skips with the set too.
-    fromString = ";;z; w";
+    fromString = ";;z; w"; // re-targeting skips with the set too
     EXPECT_EQ(drain(fromString), (Tokens{"z", " w"}));
 }
 
@@ -187,45 +148,47 @@ TEST(ZmStringTokenizerGeneral, CopiesCarryPositionAndSet)
 {
     ZmStringTokenizerGeneral a("p;q r;s", ";");
     EXPECT_EQ(text(a.nextToken()), "p");
-    ZmStringTokenizerGeneral b(a);
+    ZmStringTokenizerGeneral b(a), c("1 2", " ");
+    c = a;
     EXPECT_EQ(drain(b), (Tokens{"q r", "s"}));
-    EXPECT_EQ(drain(a), (Tokens{"q r", "s"})); // the original is not advanced by the copy
-
-    ZmStringTokenizerGeneral c("1 2", " ");
-    c = ZmStringTokenizerGeneral("u|v", "|");
-    EXPECT_EQ(drain(c), (Tokens{"u", "v"}));
+    EXPECT_EQ(drain(c), (Tokens{"q r", "s"}));
+    EXPECT_EQ(drain(a), (Tokens{"q r", "s"})); // the original is not advanced by its copies
 }
 
 // --- ZmStdStringTokenizer --------------------------------------------------------------------
 
-TEST(ZmStdStringTokenizer, SkipsEmptyPiecesAndCountsWholeText)
+// White-space splitting with the default set is PropertyJoinedTokensComeBack's.
+TEST(ZmStdStringTokenizer, SkipsEmptyPiecesWithNoQuotesOrEscapes)
 {
+    const struct {
+        const char* text;
+        const char* delims;
+        Tokens expected;
+    } cases[] = {
+        {",a,,b,", ",", {"a", "b"}},
+        {" a ", "", {" a "}}, // empty set: one token, the whole text
+        {"\"a b\"\\ c", " ", {"\"a", "b\"\\", "c"}},
+        {"", "", {}},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(stdTokens(c.text, c.delims), c.expected) << "'" << c.text << "'";
+        EXPECT_EQ(ZmStdStringTokenizer(c.text, c.delims).countTokens(), c.expected.size())
+            << "'" << c.text << "'";
+    }
+
     ZmStdStringTokenizer t(",a,,b,", ",");
     std::string out;
     t.nextToken(out);
-    EXPECT_EQ(out, "a");
     EXPECT_EQ(t.countTokens(), 2u); // counted over the whole text, also after a token was taken
     t.nextToken(out);
-    EXPECT_EQ(out, "b");
     EXPECT_FALSE(t.hasMoreTokens());
     t.nextToken(out);
     EXPECT_EQ(out, "b"); // exhausted: left unchanged
     EXPECT_EQ(t.countTokens(), 2u);
 
-    EXPECT_EQ(stdTokens("a\tb\nc\vd\fe\rf g", nullptr), (Tokens{"a", "b", "c", "d", "e", "f", "g"}));
-    EXPECT_EQ(stdTokens(" a ", ""), (Tokens{" a "})); // empty set: one token, the whole text
-    EXPECT_EQ(ZmStdStringTokenizer(" a ", "").countTokens(), 1u);
-    EXPECT_EQ(stdTokens("\"a b\"\\ c", " "), (Tokens{"\"a", "b\"\\", "c"})); // no quotes, no escapes
-    EXPECT_EQ(stdTokens("", ","), Tokens{});
-    EXPECT_EQ(stdTokens(",,,", ","), Tokens{});
-    EXPECT_EQ(ZmStdStringTokenizer(",,,", ",").countTokens(), 0u);
-    EXPECT_EQ(ZmStdStringTokenizer("", "").countTokens(), 0u);
-    EXPECT_FALSE(ZmStdStringTokenizer("", nullptr).hasMoreTokens());
-
-    ZmStdStringTokenizer other("x y", nullptr);
-    other = ZmStdStringTokenizer("p;q", ";");
-    EXPECT_EQ(other.countTokens(), 2u);
-    other.nextToken(out);
+    t = ZmStdStringTokenizer("p;q;r", ";"); // a count to differ from the cached one
+    EXPECT_EQ(t.countTokens(), 3u);
+    t.nextToken(out);
     EXPECT_EQ(out, "p");
 }
 
@@ -241,31 +204,21 @@ TEST(ZmStringTokenizer, PropertyProtectRoundTrips)
     int withWhite = 0;
     int withEscapes = 0;
     for (int iter = 0; iter < 20000; ++iter) {
-        const bool allowWhite = rng() % 2 == 0;
         std::string src(rng() % 12, ' ');
-        for (char& c : src) {
-            do {
-                c = char(1 + rng() % 255);
-                if (rng() % 3 == 0) { // favour the interesting bytes
-                    c = " \t\n\"\\a"[rng() % 6];
-                }
-            } while (allowWhite ? (c == '"' || c == '\\') : isWhite(c));
+        for (char& c : src) { // any byte but 0, favouring the interesting ones
+            c = rng() % 3 == 0 ? " \t\n\"\\a"[rng() % 6] : char(1 + rng() % 255);
         }
         const bool hasWhite = std::any_of(src.begin(), src.end(), isWhite);
         const bool hasEscapes = src.find_first_of("\"\\") != std::string::npos;
-        withWhite += hasWhite;
-        withEscapes += hasEscapes;
-
-        const ZmString s(src.c_str());
-        for (bool force : {false, true}) {
-            if (force && hasEscapes) {
-                continue;
+        for (const bool force : {false, true}) {
+            if (hasEscapes && (hasWhite || force)) {
+                continue; // outside both domains
             }
-            const ZmString prot = s.protect(force);
+            withWhite += hasWhite;
+            withEscapes += hasEscapes;
+            const ZmString prot = ZmString(src.c_str()).protect(force);
             ZmStringTokenizer t(prot);
-            ASSERT_TRUE(t.hasMoreTokens()) << "'" << src << "' force " << force;
-            ASSERT_EQ(text(t.nextToken()), src) << "protected '" << text(prot) << "'";
-            ASSERT_FALSE(t.hasMoreTokens()) << "protected '" << text(prot) << "'";
+            ASSERT_EQ(drain(t), Tokens{src}) << "protected '" << text(prot) << "', force " << force;
         }
     }
     EXPECT_GT(withWhite, 1000);
@@ -282,8 +235,16 @@ TEST(ZmStringTokenizer, PropertyJoinedTokensComeBack)
 {
     std::mt19937 rng(7007);
     const std::string white = " \t\n\r\v\f";
+    const auto run = [&](size_t least) {
+        std::string r(least + rng() % 4, ' ');
+        for (char& c : r) {
+            c = white[rng() % white.size()];
+        }
+        return r;
+    };
     for (int iter = 0; iter < 5000; ++iter) {
         Tokens list(rng() % 8);
+        std::string joined = run(0);
         for (std::string& tok : list) {
             tok.resize(1 + rng() % 6);
             for (char& c : tok) {
@@ -291,21 +252,11 @@ TEST(ZmStringTokenizer, PropertyJoinedTokensComeBack)
                     c = char(1 + rng() % 255);
                 } while (c == '"' || c == '\\' || isWhite(c));
             }
-        }
-        const auto run = [&] {
-            std::string r(rng() % 4, ' ');
-            for (char& c : r) {
-                c = white[rng() % white.size()];
-            }
-            return r;
-        };
-        std::string joined = run();
-        for (const std::string& tok : list) {
-            joined += tok + run() + white[rng() % white.size()];
+            joined += tok + run(1);
         }
         ASSERT_EQ(tokens(joined.c_str()), list) << "'" << joined << "'";
-        ASSERT_EQ(stdTokens(joined, nullptr), list) << "'" << joined << "'";
-        ASSERT_EQ(ZmStdStringTokenizer(joined, nullptr).countTokens(), list.size());
         ASSERT_EQ(tokens(joined.c_str(), white.c_str()), list) << "'" << joined << "'";
+        ASSERT_EQ(stdTokens(joined, nullptr), list) << "'" << joined << "'";
+        ASSERT_EQ(ZmStdStringTokenizer(joined, nullptr).countTokens(), list.size()) << "'" << joined << "'";
     }
 }

@@ -15,11 +15,9 @@
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
-#include <dirent.h>
 #include <fcntl.h>
 #include <filesystem>
 #include <fnmatch.h>
-#include <fstream>
 #include <string>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
