@@ -150,7 +150,25 @@ double sum(const std::vector<Eigen::Quaternionf>& v)
         s += double(q.x()) + q.y() + q.z() + q.w();
     return s;
 }
+
+double sum(const std::vector<Eigen::Affine3f>& v)
+{
+    double s = 0;
+    for (const auto& m : v)
+        s += double(m.matrix().sum());
+    return s;
+}
 #endif
+
+/// After the timed loop: one item per output, the outputs' sum as "checksum" (equal on both sides
+/// of a comparison when both computed the same thing) and the label.
+template <class Out>
+void report(benchmark::State& state, const std::vector<Out>& out, const char* label)
+{
+    state.SetItemsProcessed(int64_t(state.iterations()) * int64_t(out.size()));
+    state.counters["checksum"] = sum(out);
+    state.SetLabel(label);
+}
 
 // --- points through a 4x4 matrix ------------------------------------------------------------------
 
@@ -167,9 +185,7 @@ void MultVecMatrixZm(benchmark::State& state)
         benchmark::DoNotOptimize(dst);
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kPoints);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("ZmMat4f::multVecMatrix");
+    report(state, out, "ZmMat4f::multVecMatrix");
 }
 BENCHMARK(MultVecMatrixZm)->Name("ZmMat4f_multVecMatrix/zm")->Unit(benchmark::kMillisecond);
 
@@ -187,9 +203,7 @@ void MultVecMatrixPeer(benchmark::State& state)
         benchmark::DoNotOptimize(dst);
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kPoints);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("Eigen (Matrix4f * v.homogeneous()).hnormalized()");
+    report(state, out, "Eigen (Matrix4f * v.homogeneous()).hnormalized()");
 }
 BENCHMARK(MultVecMatrixPeer)->Name("ZmMat4f_multVecMatrix/peer")->Unit(benchmark::kMillisecond);
 #else
@@ -212,9 +226,7 @@ void ProductZm(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("ZmMat4f::operator*=");
+    report(state, out, "ZmMat4f::operator*=");
 }
 BENCHMARK(ProductZm)->Name("ZmMat4f_product/zm");
 
@@ -233,9 +245,7 @@ void ProductPeer(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("Eigen Matrix4f * Matrix4f");
+    report(state, out, "Eigen Matrix4f * Matrix4f");
 }
 BENCHMARK(ProductPeer)->Name("ZmMat4f_product/peer");
 #else
@@ -254,9 +264,7 @@ void InverseZm(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("ZmMat4f::inverse (affine path)");
+    report(state, out, "ZmMat4f::inverse (affine path)");
 }
 BENCHMARK(InverseZm)->Name("ZmMat4f_inverse/zm");
 
@@ -273,9 +281,7 @@ void InversePeer(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("Eigen Matrix4f::inverse");
+    report(state, out, "Eigen Matrix4f::inverse");
 }
 BENCHMARK(InversePeer)->Name("ZmMat4f_inverse/peer");
 
@@ -291,12 +297,7 @@ void InversePeerAffine(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    double s = 0;
-    for (const auto& m : out)
-        s += double(m.matrix().sum());
-    state.counters["checksum"] = s;
-    state.SetLabel("Eigen Affine3f::inverse");
+    report(state, out, "Eigen Affine3f::inverse");
 }
 BENCHMARK(InversePeerAffine)->Name("ZmMat4f_inverse/peer-affine3f");
 #else
@@ -318,9 +319,7 @@ void ComposeZm(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("ZmRotation::operator*= (normalises)");
+    report(state, out, "ZmRotation::operator*= (normalises)");
 }
 BENCHMARK(ComposeZm)->Name("ZmRotation_compose/zm");
 
@@ -336,9 +335,7 @@ void ComposePeer(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("Eigen (Quaternionf * Quaternionf).normalized()");
+    report(state, out, "Eigen (Quaternionf * Quaternionf).normalized()");
 }
 BENCHMARK(ComposePeer)->Name("ZmRotation_compose/peer");
 
@@ -360,9 +357,7 @@ void ComposePeerDouble(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("Eigen Quaternionf * Quaternionf, normalised in double");
+    report(state, out, "Eigen Quaternionf * Quaternionf, normalised in double");
 }
 BENCHMARK(ComposePeerDouble)->Name("ZmRotation_compose/peer-double");
 #else
@@ -382,9 +377,7 @@ void RotateZm(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("ZmRotation * ZmVec3f");
+    report(state, out, "ZmRotation * ZmVec3f");
 }
 BENCHMARK(RotateZm)->Name("ZmRotation_rotate/zm");
 
@@ -400,9 +393,7 @@ void RotatePeer(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
         benchmark::ClobberMemory();
     }
-    state.SetItemsProcessed(int64_t(state.iterations()) * kCount);
-    state.counters["checksum"] = sum(out);
-    state.SetLabel("Eigen Quaternionf * Vector3f");
+    report(state, out, "Eigen Quaternionf * Vector3f");
 }
 BENCHMARK(RotatePeer)->Name("ZmRotation_rotate/peer");
 #else
