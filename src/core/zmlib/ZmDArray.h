@@ -12,6 +12,12 @@
 #include <type_traits>
 #include <utility>
 
+/// Sorts \p n elements of \p size bytes at \p base with a comparison that receives \p context
+/// (the runtime's qsort, not stable). The one non-template step of `ZmDArray::sort`, so that the
+/// header carries no platform-specific sorting call.
+ZMLIB_API void zmSortWithContext(void* base, size_t n, size_t size,
+                                 int (*compare)(const void*, const void*, void*), void* context);
+
 /// A growable array of bitwise-relocatable elements with signed 64-bit size and capacity.
 ///
 /// Owns one block from `zmmalloc`/`zmrealloc` (null while the capacity is 0) and moves elements
@@ -27,7 +33,17 @@
 /// destroyed, so that `ZmDArray<ZmString>` neither leaks nor touches garbage. Copies into the array
 /// are copy-constructed in place, from the last new slot to the first.
 ///
-/// Allocation failure throws `ZmMemoryException`. Not thread-safe: one thread at a time.
+/// Failure: allocation failure throws `ZmMemoryException`, and an element copy or default
+/// construction that throws passes its exception on. Either way the elements and the size are left
+/// as they were before the call: whatever was built is destroyed again and the gap closed. Two
+/// exceptions to that: an assignment of a whole array whose element assignment throws leaves a
+/// mix of old and new values (every element still valid), and a failed growth inside an insert
+/// or append leaves `getMax()` at the capacity it was growing to while the block keeps its old
+/// size. A caller that catches the exception and goes on using the array must therefore call
+/// `remax(-1, -1)` first, which makes the block and the capacity agree again; until then an
+/// append that fits the stated capacity would write past the end of the block.
+///
+/// Not thread-safe: one thread at a time.
 template <class T>
 class ZmDArray {
 public:
@@ -40,9 +56,25 @@ public:
     ZmDArray() noexcept = default;
     /// Starts empty, then `remax(max, size)` (note the swapped order): the capacity is at least
     /// the size.
-    ZmDArray(int64_t size, int64_t max) { remax(max, size); }
+    ZmDArray(int64_t size, int64_t max)
+    {
+        try {
+            remax(max, size);
+        } catch (...) {
+            zmfree(m_data); // no destructor runs for a constructor that throws
+            throw;
+        }
+    }
     /// The copy's capacity is exactly the source's size.
-    ZmDArray(const ZmDArray& other) { insert(0, other.m_size, other.m_data); }
+    ZmDArray(const ZmDArray& other)
+    {
+        try {
+            insert(0, other.m_size, other.m_data);
+        } catch (...) {
+            zmfree(m_data);
+            throw;
+        }
+    }
     ZmDArray(ZmDArray&& other) noexcept : m_size(other.m_size), m_max(other.m_max), m_data(other.m_data)
     {
         other.m_size = 0;
@@ -216,7 +248,12 @@ public:
             return;
         }
         insertMemory(pos, n);
-        constructRange(pos, pos + n);
+        try {
+            constructRange(pos, pos + n);
+        } catch (...) {
+            closeGap(pos, n);
+            throw;
+        }
     }
 
     // --- removing ------------------------------------------------------------------------------
@@ -324,8 +361,9 @@ public:
 protected:
     /// Opens an uninitialised gap of \p n at \p pos, growing to max(1.5 * size, size + n).
     /// The capacity field is updated before the reallocation: after a failed growth it already
-    /// holds the new value while the block is the old one. Deliberate, kept for callers that
-    /// inspect the capacity after catching the failure (resize and remax update it afterwards).
+    /// holds the new value while the block is the old one (see the class comment for what a
+    /// caller that catches the failure must do). Deliberate, kept for callers that inspect the
+    /// capacity after catching the failure (resize and remax update it afterwards).
     void insertMemory(int64_t pos, int64_t n);
 
     int64_t m_size = 0;
@@ -352,11 +390,19 @@ private:
         return static_cast<size_t>(n) * sizeof(T);
     }
     void reallocate(int64_t newMax) { m_data = static_cast<T*>(zmrealloc(m_data, bytesFor(newMax))); }
+    /// Default-constructs slots \p from .. \p to - 1; when a constructor throws, the slots built
+    /// so far are destroyed again before the exception goes on.
     void constructRange(int64_t from, int64_t to)
     {
         if constexpr (!kTrivialLifetime) {
-            for (int64_t i = from; i < to; ++i) {
-                new (static_cast<void*>(m_data + i)) T();
+            int64_t i = from;
+            try {
+                for (; i < to; ++i) {
+                    new (static_cast<void*>(m_data + i)) T();
+                }
+            } catch (...) {
+                destroyRange(from, i);
+                throw;
             }
         } else {
             (void)from;
@@ -393,6 +439,15 @@ private:
         }
     }
     void insertSlow(int64_t pos, int64_t n, const T* src);
+    /// Undoes insertMemory(pos, n) for a gap holding no live element: moves the tail back down.
+    void closeGap(int64_t pos, int64_t n) noexcept
+    {
+        const int64_t tail = m_size - pos - n;
+        if (tail > 0) {
+            relocate(m_data + pos, m_data + pos + n, tail);
+        }
+        m_size -= n;
+    }
     /// Narrows the exclusive bounds (lo, hi) around the place of \p v (hi -1 = the size).
     void bisect(const T& v, CompareFn compare, int64_t& lo, int64_t& hi) const;
 };
@@ -486,8 +541,18 @@ void ZmDArray<T>::insertSlow(int64_t pos, int64_t n, const T* src)
     if constexpr (std::is_trivially_copyable_v<T>) {
         std::memmove(static_cast<void*>(m_data + pos), src, sizeof(T) * size_t(n));
     } else {
-        for (int64_t i = n - 1; i >= 0; --i) {
-            new (static_cast<void*>(m_data + pos + i)) T(src[i]);
+        // Built from the last new slot to the first. A copy that throws leaves slots i + 1 .. n - 1
+        // built: they are destroyed and the gap closed, so the array is as it was (the size is
+        // not left counting slots that hold nothing).
+        int64_t i = n - 1;
+        try {
+            for (; i >= 0; --i) {
+                new (static_cast<void*>(m_data + pos + i)) T(src[i]);
+            }
+        } catch (...) {
+            destroyRange(pos + i + 1, pos + n);
+            closeGap(pos, n);
+            throw;
         }
     }
 }
@@ -573,7 +638,7 @@ void ZmDArray<T>::sort(CompareFn compare)
     auto trampoline = [](const void* a, const void* b, void* fn) -> int {
         return reinterpret_cast<CompareFn>(fn)(*static_cast<const T*>(a), *static_cast<const T*>(b));
     };
-    ::qsort_r(m_data, size_t(m_size), sizeof(T), trampoline, reinterpret_cast<void*>(compare));
+    zmSortWithContext(m_data, size_t(m_size), sizeof(T), trampoline, reinterpret_cast<void*>(compare));
 }
 
 template <class T>

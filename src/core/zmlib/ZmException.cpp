@@ -4,6 +4,9 @@
 
 ZmException::ZmException() = default;
 
+ZmException::ZmException(NoAllocation) noexcept : m_message(ZmString::NoBlock{})
+{}
+
 ZmException::ZmException(const char* fmt, ...)
 {
     va_list args;
@@ -20,7 +23,10 @@ ZmException::ZmException(const ZmException& other) : std::exception(other), m_me
 
 ZmException& ZmException::operator=(const ZmException& other)
 {
-    m_message = other.m_message;
+    if (this != &other) {
+        // An assignment from a message-less exception must not copy its missing terminator.
+        m_message = other.m_message.dataPtr() != nullptr ? other.m_message.getString() : "";
+    }
     return *this;
 }
 
@@ -28,7 +34,7 @@ ZmException::~ZmException() = default;
 
 const char* ZmException::what() const noexcept
 {
-    return m_message.getString();
+    return m_message.dataPtr() != nullptr ? m_message.getString() : "";
 }
 
 ZmException* ZmException::clone() const

@@ -19,6 +19,7 @@ public:
     explicit ZmException(const char* fmt, ...) ZMLIB_PRINTF(2, 3);
     /// A copy of \p message.
     explicit ZmException(ZmString& message);
+    /// Copies the message; an exception holding no message memory is copied without allocating.
     ZmException(const ZmException& other);
     ZmException& operator=(const ZmException& other);
     ~ZmException() override;
@@ -37,6 +38,10 @@ public:
 protected:
     /// An empty message.
     ZmException();
+    struct NoAllocation {};
+    /// An empty message that holds no memory, so that the exception of a failed allocation can be
+    /// built and copied while the heap refuses every request. `what()` gives the empty text.
+    explicit ZmException(NoAllocation) noexcept;
 
     /// Returns a new `ZmException` copy of this object.
     virtual ZmException* doClone() const;

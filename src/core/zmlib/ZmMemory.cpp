@@ -1,13 +1,28 @@
 #include <zmlib/ZmMemory.h>
 
 #include <zmlib/ZmMemoryException.h>
-#include <zmlib/ZmString.h>
 
+#include <atomic>
+#include <cstddef>
+#include <cstdio>
 #include <cstdlib>
+
+namespace {
+
+// Constant-initialised (no global constructor) and atomic, since any allocating thread reads it.
+std::atomic<ZmAllocationFailureHook> g_failureHook{nullptr};
+
+bool injectedFailure(uint64_t size)
+{
+    const ZmAllocationFailureHook hook = g_failureHook.load(std::memory_order_acquire);
+    return hook != nullptr && hook(size);
+}
+
+} // namespace
 
 void* zmmalloc(uint64_t size)
 {
-    void* p = std::malloc(size);
+    void* p = injectedFailure(size) ? nullptr : std::malloc(size);
     if (p == nullptr) {
         throw ZmMemoryException(size);
     }
@@ -23,12 +38,12 @@ void* zmrealloc(void* p, uint64_t size)
         std::free(p);
         return nullptr;
     }
-    void* q = std::realloc(p, size);
+    void* q = injectedFailure(size) ? nullptr : std::realloc(p, size);
     if (q == nullptr) {
-        // The formatted text is built and dropped on purpose: callers see the exception's own
-        // text, which names the same byte count.
-        ZmString text;
-        text.printf("could not reallocate %zd bytes", static_cast<ptrdiff_t>(size));
+        // The failure text is formatted and dropped as it always was (the exception formats its
+        // own, which callers see), but on the stack: nothing on this path may allocate.
+        char text[64];
+        std::snprintf(text, sizeof text, "could not reallocate %zd bytes", static_cast<ptrdiff_t>(size));
         throw ZmMemoryException(size);
     }
     return q;
@@ -39,4 +54,9 @@ void zmfree(void* p)
     if (p != nullptr) {
         std::free(p);
     }
+}
+
+ZmAllocationFailureHook zmSetAllocationFailureHook(ZmAllocationFailureHook hook)
+{
+    return g_failureHook.exchange(hook, std::memory_order_acq_rel);
 }

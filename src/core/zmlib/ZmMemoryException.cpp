@@ -1,20 +1,22 @@
 #include <zmlib/ZmMemoryException.h>
 
-#include <cinttypes>
 #include <cstdio>
+#include <cstring>
 
-ZmMemoryException::ZmMemoryException() = default;
-
-ZmMemoryException::ZmMemoryException(uint64_t numBytes) : m_numBytes(numBytes)
+ZmMemoryException::ZmMemoryException() : ZmException(NoAllocation{})
 {}
 
+ZmMemoryException::ZmMemoryException(uint64_t numBytes) : ZmException(NoAllocation{}), m_numBytes(numBytes)
+{}
+
+// The copy goes through the non-allocating base constructor too: the base message of a memory
+// exception is never used, its text is formatted by what().
 ZmMemoryException::ZmMemoryException(const ZmMemoryException& other)
-    : ZmException(other), m_numBytes(other.m_numBytes)
+    : ZmException(NoAllocation{}), m_numBytes(other.m_numBytes)
 {}
 
 ZmMemoryException& ZmMemoryException::operator=(const ZmMemoryException& other)
 {
-    ZmException::operator=(other);
     m_numBytes = other.m_numBytes;
     return *this;
 }
@@ -23,18 +25,9 @@ ZmMemoryException::~ZmMemoryException() = default;
 
 const char* ZmMemoryException::what() const noexcept
 {
-    static const char kUnknown[] = "could not allocate enough memory";
     if (m_numBytes == 0) {
-        return kUnknown;
+        return "could not allocate enough memory";
     }
-    // The text is formatted on the stack first: storing it in the message may itself need memory,
-    // and a handler asking an out-of-memory exception for its text must still get one.
-    char text[64];
-    std::snprintf(text, sizeof text, "could not allocate %zu bytes", static_cast<size_t>(m_numBytes));
-    try {
-        m_message = text;
-    } catch (...) {
-        return kUnknown;
-    }
-    return m_message.getString();
+    std::snprintf(m_text, sizeof m_text, "could not allocate %zu bytes", static_cast<size_t>(m_numBytes));
+    return m_text;
 }

@@ -10,6 +10,9 @@
 ///
 /// Holds the requested byte count (0 when unknown). `what()` formats its text anew on each call:
 /// "could not allocate enough memory" for 0, else "could not allocate N bytes".
+///
+/// Nothing about it allocates: construction, copies, `throw` and `what()` work while the heap
+/// refuses every request, which is exactly when it is thrown. Its text lives in the object.
 class ZMLIB_API ZmMemoryException : public ZmException {
 public:
     ZmMemoryException();
@@ -24,4 +27,6 @@ public:
 
 private:
     uint64_t m_numBytes = 0;
+    /// Room for the longest text, "could not allocate 18446744073709551615 bytes".
+    mutable char m_text[48] = {};
 };

@@ -186,6 +186,12 @@ public:
     static int64_t toInt64(const char* s);
 
 private:
+    friend class ZmException;
+    struct NoBlock {};
+    /// Holds no block at all (size 0, data null): the one state that breaks the invariant, used
+    /// only by exceptions that must be built without allocating. getString() is null there.
+    explicit ZmString(NoBlock) noexcept {}
+
     /// Drops the terminator before appending.
     void remove0() { --m_size; }
     /// \p pred holds for every byte of the text (true for the empty text).

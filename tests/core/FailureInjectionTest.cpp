@@ -1,0 +1,150 @@
+// The out-of-memory and throwing-copy paths of the core types, walked failure point by failure
+// point: every object must come out as its contract says, and ASan/LSan watch for leaks and
+// double destruction.
+#include "FailureInjection.h"
+
+#include <zmlib/ZmDArray.h>
+#include <zmlib/ZmException.h>
+#include <zmlib/ZmMemory.h>
+#include <zmlib/ZmMemoryException.h>
+#include <zmlib/ZmString.h>
+
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <cstring>
+#include <vector>
+
+namespace {
+
+template <class T>
+std::vector<int> values(const ZmDArray<T>& a)
+{
+    std::vector<int> out;
+    for (int64_t i = 0; i < a.size(); ++i) {
+        if constexpr (std::is_same_v<T, ZmString>) {
+            out.push_back(a[i].toInt64() == 0 ? -1 : int(a[i].toInt64()));
+        } else {
+            out.push_back(a[i].value());
+        }
+    }
+    return out;
+}
+
+} // namespace
+
+TEST(FailureInjection, HookFailsExactlyTheChosenRequestAndIsRemovedAfterwards)
+{
+    {
+        const FailAllocation fail(2);
+        void* first = zmmalloc(8);
+        EXPECT_THROW(zmrealloc(first, 64), ZmMemoryException); // the 2nd request
+        std::memset(first, 1, 8);                              // the old block is still ours (ASan)
+        first = zmrealloc(first, 64);
+        zmfree(first);
+        EXPECT_EQ(FailAllocation::failed(), 1);
+    }
+    zmfree(zmmalloc(8)); // no hook left behind
+    const FailAllocation always(1, true);
+    EXPECT_THROW(zmmalloc(1), ZmMemoryException);
+    EXPECT_THROW(zmmalloc(1), ZmMemoryException);
+}
+
+// While every request fails, the exception of the failed request itself must still arrive
+// intact: building, copying, throwing and asking it for its text may not allocate.
+TEST(FailureInjection, MemoryExceptionArrivesWhileEveryRequestFails)
+{
+    void* p = zmmalloc(10);
+    const FailAllocation always(1, true);
+    try {
+        zmfree(zmmalloc(100));
+        FAIL() << "zmmalloc returned";
+    } catch (const ZmMemoryException& e) {
+        const ZmMemoryException copy(e);
+        EXPECT_EQ(copy.getNumBytes(), 100u);
+        EXPECT_STREQ(e.what(), "could not allocate 100 bytes");
+    }
+    try {
+        zmrealloc(p, 1u << 20);
+        FAIL() << "zmrealloc returned";
+    } catch (const ZmException& e) {
+        EXPECT_STREQ(e.what(), "could not allocate 1048576 bytes");
+        try {
+            e.raise(); // the base copy of a message-less exception
+        } catch (const ZmException& raised) {
+            EXPECT_STREQ(raised.what(), "");
+        }
+    }
+    zmfree(p);
+    EXPECT_GE(FailAllocation::failed(), 2);
+}
+
+// A copy that throws in the middle of an insert used to leave the size counting slots that held
+// no element, which the destructor then destroyed (a double free). Every position and failing
+// copy: the array keeps its elements and size.
+TEST(FailureInjection, ArrayInsertWithThrowingCopiesRollsBack)
+{
+    ThrowingCopy::live() = 0;
+    const ThrowingCopy src[3] = {7, 8, 9};
+    for (int pos = 0; pos <= 3; ++pos) {
+        for (int budget = 0; budget < 3; ++budget) {
+            for (const bool roomy : {false, true}) {
+                ZmDArray<ThrowingCopy> a;
+                if (roomy) {
+                    a.remax(10, 0);
+                }
+                for (int v : {1, 2, 3}) {
+                    a.append(v);
+                }
+                const int64_t maxBefore = a.getMax();
+                ThrowingCopy::budget() = budget;
+                EXPECT_THROW(a.insert(pos, 3, src), ThrowingCopy::CopyFailed);
+                ThrowingCopy::budget() = -1;
+                EXPECT_EQ(values(a), (std::vector<int>{1, 2, 3})) << pos << " " << budget;
+                EXPECT_EQ(ThrowingCopy::live(), 3 + 3);
+                if (roomy) {
+                    EXPECT_EQ(a.getMax(), maxBefore);
+                }
+                a.insert(pos, 1, src); // still usable: the block is the one getMax() reports
+                EXPECT_EQ(a.size(), 4);
+            }
+        }
+    }
+    // A copy of a whole array whose element copy throws frees its block (LSan).
+    ZmDArray<ThrowingCopy> full;
+    full.append(3, src);
+    ThrowingCopy::budget() = 1;
+    EXPECT_THROW(ZmDArray<ThrowingCopy>{full}, ThrowingCopy::CopyFailed);
+    ThrowingCopy::budget() = -1;
+    EXPECT_EQ(ThrowingCopy::live(), 3 + 3);
+}
+
+// ZmDArray<ZmString>: a string copy that runs out of memory is the throwing copy of real code.
+TEST(FailureInjection, ArrayOfStringsUnderEveryAllocationFailure)
+{
+    ZmDArray<ZmString> src;
+    for (const char* s : {"4", "5", "6"}) {
+        src.append(ZmString(s));
+    }
+    ZmDArray<ZmString> a;
+    const FailureWalk walk = walkAllocationFailures(
+        [&] {
+            a = ZmDArray<ZmString>();
+            a.remax(8, 0);
+            for (const char* s : {"1", "2", "3"}) {
+                a.append(ZmString(s));
+            }
+            a.insert(1, src.size(), src.dataPtr());
+            a.insertSpace(0, 2);
+            a.appendArray(src);
+        },
+        [&](int64_t, bool threw) {
+            ASSERT_TRUE(threw);
+            EXPECT_TRUE(a.isConsistent());
+            for (int64_t i = 0; i < a.size(); ++i) {
+                EXPECT_EQ(a[i].length(), a[i].isEmptyString() ? 0 : 1) << i;
+            }
+        });
+    EXPECT_GT(walk.thrown, 8);
+    EXPECT_EQ(values(a), (std::vector<int>{-1, -1, 1, 4, 5, 6, 2, 3, 4, 5, 6}));
+}
