@@ -5,6 +5,12 @@
 /// that form its interface. A static build (`ZMLIB_STATIC`) needs no marking.
 #pragma once
 
+// Every public header includes this one, so this is where a too-old language mode is caught, with
+// a clear message instead of errors deep in the headers. Any later standard is fine.
+#if !defined(__cplusplus) || __cplusplus < 201703L
+#error "zmlib needs C++17 or later (for example -std=c++17 or -std=c++20)"
+#endif
+
 #if defined(ZMLIB_STATIC)
 #define ZMLIB_API
 #else
