@@ -3,6 +3,8 @@
 #   make test     install what is missing, build, run the whole test suite
 #   make asan     the same tests under AddressSanitizer + UndefinedBehaviorSanitizer
 #   make tsan     the same tests under ThreadSanitizer
+#   make clang    the tests built with Clang (warnings as errors, lock analysis, no global ctors)
+#   make tidy     clang-tidy over the library (any finding fails)
 #   make bench    release build, run the benchmarks, write docs/benchmarks.md
 #   make fuzz     clang build, run every fuzz target for FUZZ_SECONDS (default 60) each
 #   make install  install into PREFIX (default /usr/local)
@@ -11,7 +13,7 @@ SHELL := /bin/bash
 FUZZ_SECONDS ?= 60
 PREFIX ?= /usr/local
 
-.PHONY: all deps build demo test asan tsan bench fuzz install format clean
+.PHONY: all deps build demo test asan tsan clang tidy bench fuzz install format clean
 
 all: demo
 
@@ -37,6 +39,17 @@ tsan: deps
 	cmake --preset tsan
 	cmake --build --preset tsan
 	ctest --preset tsan
+
+clang:
+	@tools/install-deps.sh clang
+	cmake --preset clang
+	cmake --build --preset clang
+	ctest --preset clang
+
+tidy:
+	@tools/install-deps.sh clang tidy
+	cmake --preset clang
+	tools/run-clang-tidy.sh build/clang
 
 bench:
 	@tools/install-deps.sh bench

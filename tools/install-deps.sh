@@ -3,6 +3,7 @@
 #   tools/install-deps.sh            build, tests and zmtool
 #   tools/install-deps.sh bench      ... plus the benchmark peers
 #   tools/install-deps.sh fuzz       ... plus clang and libFuzzer
+#   tools/install-deps.sh clang|tidy ... plus clang, or clang-tidy and clang-format
 set -euo pipefail
 
 # libeigen3-dev: the tests' and benchmarks' linear-algebra oracle, never linked into the library.
@@ -11,6 +12,7 @@ for extra in "$@"; do
   case "$extra" in
     bench) packages+=(libbenchmark-dev libspdlog-dev libssl-dev) ;;
     fuzz) packages+=(clang libclang-rt-dev) ;;
+    clang) packages+=(clang) ;;
     tidy) packages+=(clang-tidy clang-format) ;;
     *) echo "install-deps: unknown group '$extra'" >&2; exit 2 ;;
   esac

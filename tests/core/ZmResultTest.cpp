@@ -168,7 +168,7 @@ TEST(ZmResult, NotifyCallsNewestFirstUntilOneIsDone)
 
 TEST(Kv, ErrorTakesTheShortTableTextAndTheCallersContext)
 {
-    Kv::lastError(false);
+    (void)Kv::lastError(false); // clears the thread's last error
     const ZmResult r = Kv::kvError(ZmResult::WriteFileFailed, "w.cpp", 7, "save", "Nov 21 2026", "10:00:00",
                                    "disk", true, false);
     EXPECT_STREQ(r.text(), "failed to write file");
@@ -196,7 +196,7 @@ TEST(Kv, FailLogsTheBlockKeepsTheFirstLastErrorAndNotifies)
     ZmResult::notificationCallbackRemoveAll();
     ZmResult::notificationCallbackAdd(callbackA);
     g_calls.clear();
-    Kv::lastError(false);
+    (void)Kv::lastError(false); // clears the thread's last error
     LogCapture log(ZmLogError);
     EXPECT_FALSE(Kv::fail(ZmResult()));
     EXPECT_TRUE(LogCapture::lines().empty());
@@ -220,7 +220,7 @@ TEST(Kv, FailLogsTheBlockKeepsTheFirstLastErrorAndNotifies)
 TEST(Kv, FailWinAndLogWinFuncAddTheSystemText)
 {
     LogCapture log;
-    Kv::lastError(false);
+    (void)Kv::lastError(false); // clears the thread's last error
     errno = ENOENT;
     EXPECT_TRUE(Kv::failWin(ZmResult(ZmResult::ReadFileFailed, 3, "r.cpp", "open", "path")));
     const std::string expected = std::string("open error[2 ") + std::strerror(ENOENT) + "]";
@@ -251,7 +251,7 @@ TEST(Kv, FailWinAndLogWinFuncAddTheSystemText)
 
 TEST(Kv, LastErrorIsPerThread)
 {
-    Kv::lastError(false);
+    (void)Kv::lastError(false); // clears the thread's last error
     const ZmResult mine(ZmResult::False, "main", nullptr);
     Kv::setError(mine);
     ZmResult seenByOther(ZmResult::InternalError, nullptr, nullptr);

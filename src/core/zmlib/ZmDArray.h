@@ -232,7 +232,7 @@ public:
             // string and buffer append stays a single copy (a move, since a source inside the
             // block may overlap the unused tail after a size reset such as string assignment).
             if (n > 0 && pos == m_size && m_size + n <= m_max) {
-                std::memmove(static_cast<void*>(m_data + m_size), src, sizeof(T) * size_t(n));
+                std::memmove(static_cast<void*>(m_data + m_size), src, kElementSize * size_t(n));
                 m_size += n;
                 return;
             }
@@ -339,7 +339,7 @@ public:
     void fillZero()
     {
         if (m_size > 0) {
-            std::memset(static_cast<void*>(m_data), 0, sizeof(T) * size_t(m_size));
+            std::memset(static_cast<void*>(m_data), 0, kElementSize * size_t(m_size));
         }
     }
 
@@ -371,6 +371,9 @@ protected:
     T* m_data = nullptr;
 
 private:
+    // The element size in one place: for pointer element types a size check would otherwise read
+    // sizeof(T) as the suspicious sizeof of a pointer.
+    static constexpr size_t kElementSize = sizeof(T); // NOLINT(bugprone-sizeof-expression)
     static constexpr bool kTrivialLifetime =
         std::is_trivially_default_constructible_v<T> && std::is_trivially_destructible_v<T>;
 
@@ -384,10 +387,10 @@ private:
     {
         // A count whose byte size does not fit saturates, so that the heap refuses it and the
         // caller gets the usual ZmMemoryException instead of a wrapped-around small block.
-        if (n < 0 || static_cast<uint64_t>(n) > SIZE_MAX / sizeof(T)) {
+        if (n < 0 || static_cast<uint64_t>(n) > SIZE_MAX / kElementSize) {
             return SIZE_MAX;
         }
-        return static_cast<size_t>(n) * sizeof(T);
+        return static_cast<size_t>(n) * kElementSize;
     }
     void reallocate(int64_t newMax) { m_data = static_cast<T*>(zmrealloc(m_data, bytesFor(newMax))); }
     /// Default-constructs slots \p from .. \p to - 1; when a constructor throws, the slots built
@@ -424,13 +427,13 @@ private:
     /// by contract, class types included, so no constructor or destructor runs.
     static void relocate(T* dst, const T* src, int64_t n)
     {
-        std::memmove(static_cast<void*>(dst), static_cast<const void*>(src), sizeof(T) * size_t(n));
+        std::memmove(static_cast<void*>(dst), static_cast<const void*>(src), kElementSize * size_t(n));
     }
     static void copyAssign(T* dst, const T* src, int64_t n)
     {
         if constexpr (std::is_trivially_copyable_v<T>) {
             if (n > 0) {
-                std::memcpy(static_cast<void*>(dst), src, sizeof(T) * size_t(n));
+                std::memcpy(static_cast<void*>(dst), src, kElementSize * size_t(n));
             }
         } else {
             for (int64_t i = 0; i < n; ++i) {
@@ -539,7 +542,7 @@ void ZmDArray<T>::insertSlow(int64_t pos, int64_t n, const T* src)
         insertMemory(pos, n);
     }
     if constexpr (std::is_trivially_copyable_v<T>) {
-        std::memmove(static_cast<void*>(m_data + pos), src, sizeof(T) * size_t(n));
+        std::memmove(static_cast<void*>(m_data + pos), src, kElementSize * size_t(n));
     } else {
         // Built from the last new slot to the first. A copy that throws leaves slots i + 1 .. n - 1
         // built: they are destroyed and the gap closed, so the array is as it was (the size is

@@ -13,8 +13,12 @@
 
 #if defined(ZMLIB_STATIC)
 #define ZMLIB_API
+/// `ZMLIB_API` for a class whose values must not be discarded (GCC takes `[[nodiscard]]` on a
+/// class only in the standard attribute syntax, so both go into one attribute list).
+#define ZMLIB_NODISCARD_API [[nodiscard]]
 #else
 #define ZMLIB_API __attribute__((visibility("default")))
+#define ZMLIB_NODISCARD_API [[nodiscard, gnu::visibility("default")]]
 #endif
 
 /// printf-style format checking for the library's variadic formatters.

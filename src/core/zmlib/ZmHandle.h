@@ -28,11 +28,13 @@ public:
 
     ZmHandle& operator=(const ZmHandle& other)
     {
-        reset(other.m_p);
+        if (this != &other) {
+            reset(other.m_p);
+        }
         return *this;
     }
     /// Takes over \p other's reference and releases the old object at once.
-    ZmHandle& operator=(ZmHandle&& other)
+    ZmHandle& operator=(ZmHandle&& other) noexcept
     {
         if (this != &other) {
             T* old = m_p;

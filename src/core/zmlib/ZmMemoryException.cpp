@@ -17,7 +17,9 @@ ZmMemoryException::ZmMemoryException(const ZmMemoryException& other)
 
 ZmMemoryException& ZmMemoryException::operator=(const ZmMemoryException& other)
 {
-    m_numBytes = other.m_numBytes;
+    if (this != &other) {
+        m_numBytes = other.m_numBytes;
+    }
     return *this;
 }
 

@@ -19,7 +19,10 @@
 ///
 /// The record's count is not atomic: a result may be handed to another thread, but copies of one
 /// record must not be made or dropped by two threads at once.
-class ZMLIB_API ZmResult {
+///
+/// `[[nodiscard]]`: a function returning a result by value reports a failure nobody may ignore
+/// silently; a caller that means to ignore one says so with a `(void)` cast.
+class ZMLIB_NODISCARD_API ZmResult {
 public:
     /// The library's codes; 1280-1285 are graphics-library errors, `ErrnoBase` + n is errno n.
     /// Other numbers may be used; they have no default text.
