@@ -3,8 +3,7 @@
 #pragma once
 
 #include <zmlib/ZmExport.h>
-#include <zmlib/ZmID.h>
-#include <zmlib/ZmString.h>
+#include <zmlib/ZmInt64ID.h>
 
 #include <cstdint>
 
@@ -15,16 +14,10 @@
 ///
 /// A plain value: copy it freely between threads. Nothing fails: a text that is no number reads
 /// as the runtime's 64-bit `atoi` reads it (0 when nothing converts).
-class ZMLIB_API ZmFrameID : public ZmID<int64_t, -1> {
+class ZMLIB_API ZmFrameID : public ZmInt64ID<ZmFrameID, -1> {
 public:
     constexpr ZmFrameID() noexcept = default;
-    constexpr explicit ZmFrameID(int64_t v) noexcept : ZmID<int64_t, -1>(v) {}
-
-    static ZmFrameID fromInt64(int64_t v) noexcept { return ZmFrameID(v); }
-    /// The number at the start of \p text (`ZmString::toInt64`); null gives frame 0.
-    static ZmFrameID fromLatin1(const char* text);
-    /// The decimal value.
-    ZmString toZmString() const;
+    constexpr explicit ZmFrameID(int64_t v) noexcept : ZmInt64ID<ZmFrameID, -1>(v) {}
 
     /// Every value >= -1 (intended, see above).
     bool isValid() const noexcept { return value() >= -1; }

@@ -4,7 +4,6 @@
 #include <charconv>
 #include <cstdio>
 #include <cstdlib>
-#include <strings.h>
 
 // The exported instantiation of the array behind every string.
 template class ZmDArray<char>;
@@ -108,24 +107,9 @@ bool ZmString::isEqualTo(const ZmString& other, bool ignoreCase) const
         return false;
     }
     if (ignoreCase) {
-        return ::strncasecmp(m_data, other.m_data, size_t(length())) == 0;
+        return strncasecmp(m_data, other.m_data, size_t(length())) == 0;
     }
     return std::strcmp(m_data, other.m_data) == 0;
-}
-
-int ZmString::strcasecmp(const char* a, const char* b)
-{
-    return ::strcasecmp(a, b);
-}
-
-int ZmString::strncasecmp(const char* a, const char* b, uint64_t n)
-{
-    return ::strncasecmp(a, b, n);
-}
-
-char* ZmString::strtok(char* s, const char* delims, char** context)
-{
-    return ::strtok_r(s, delims, context);
 }
 
 int ZmString::rindex(char c, int start) const
@@ -166,7 +150,7 @@ int ZmString::iindex(const char* sub) const
     const int first = std::toupper(static_cast<unsigned char>(sub[0]));
     for (int p = 0; p <= length() - n; ++p) {
         if (std::toupper(static_cast<unsigned char>(m_data[p])) == first &&
-            ::strncasecmp(m_data + p, sub, size_t(n)) == 0) {
+            strncasecmp(m_data + p, sub, size_t(n)) == 0) {
             return p;
         }
     }
@@ -340,10 +324,17 @@ char* ZmString::vprintf(const char* fmt, va_list args)
     while (len > limit) {
         limit *= 2;
     }
-    if (limit != m_size) {
-        resize(limit); // the reallocation keeps the bytes already formatted
+    try {
+        if (limit != m_size) {
+            resize(limit); // the reallocation keeps the bytes already formatted
+        }
+        resize(len == limit ? limit + 1 : int64_t(len) + 1);
+    } catch (...) {
+        // The block holds the formatted text cut at its end: keep it cut at the size, so that the
+        // string stays terminated where length() says.
+        m_data[m_size - 1] = 0;
+        throw;
     }
-    resize(len == limit ? limit + 1 : int64_t(len) + 1);
     if (!complete) {
         va_list second;
         va_copy(second, args);

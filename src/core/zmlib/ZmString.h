@@ -138,7 +138,12 @@ public:
     {
         if (s != nullptr) {
             remove0();
-            append(int64_t(std::strlen(s)) + 1, s);
+            try {
+                append(int64_t(std::strlen(s)) + 1, s);
+            } catch (...) {
+                ++m_size; // the terminator is still in place: a failed append changes nothing
+                throw;
+            }
         }
         return *this;
     }
@@ -171,7 +176,9 @@ public:
     // --- numbers -------------------------------------------------------------------------------
 
     /// Replaces the content with the formatted text; returns the data pointer. Formats into the
-    /// string's own block, doubling it while the text does not fit.
+    /// string's own block, doubling it while the text does not fit. When that growth fails, the
+    /// string holds the start of the formatted text (terminated at its length) as the
+    /// `ZmMemoryException` leaves; every other editing operation leaves the text as it was.
     char* printf(const char* fmt, ...) ZMLIB_PRINTF(2, 3);
     char* vprintf(const char* fmt, va_list args);
     /// The decimal text of \p v.

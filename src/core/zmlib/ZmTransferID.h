@@ -3,8 +3,7 @@
 #pragma once
 
 #include <zmlib/ZmExport.h>
-#include <zmlib/ZmID.h>
-#include <zmlib/ZmString.h>
+#include <zmlib/ZmInt64ID.h>
 
 #include <cstdint>
 
@@ -13,14 +12,8 @@
 ///
 /// A plain value: copy it freely between threads. Nothing fails: a text that is no number reads
 /// as the runtime's 64-bit `atoi` reads it (0 when nothing converts).
-class ZMLIB_API ZmTransferID : public ZmID<int64_t, 0> {
+class ZMLIB_API ZmTransferID : public ZmInt64ID<ZmTransferID, 0> {
 public:
     constexpr ZmTransferID() noexcept = default;
-    constexpr explicit ZmTransferID(int64_t v) noexcept : ZmID<int64_t, 0>(v) {}
-
-    static ZmTransferID fromInt64(int64_t v) noexcept { return ZmTransferID(v); }
-    /// The number at the start of \p text (`ZmString::toInt64`); null gives the empty identifier.
-    static ZmTransferID fromLatin1(const char* text);
-    /// The decimal value.
-    ZmString toZmString() const;
+    constexpr explicit ZmTransferID(int64_t v) noexcept : ZmInt64ID<ZmTransferID, 0>(v) {}
 };

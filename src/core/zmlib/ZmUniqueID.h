@@ -3,8 +3,7 @@
 #pragma once
 
 #include <zmlib/ZmExport.h>
-#include <zmlib/ZmID.h>
-#include <zmlib/ZmString.h>
+#include <zmlib/ZmInt64ID.h>
 
 #include <cstdint>
 
@@ -12,16 +11,10 @@
 ///
 /// A plain value: copy it freely between threads. Nothing fails: a text that is no number reads
 /// as the runtime's 64-bit `atoi` reads it (0 when nothing converts).
-class ZMLIB_API ZmUniqueID : public ZmID<int64_t, 0> {
+class ZMLIB_API ZmUniqueID : public ZmInt64ID<ZmUniqueID, 0> {
 public:
     constexpr ZmUniqueID() noexcept = default;
-    constexpr explicit ZmUniqueID(int64_t v) noexcept : ZmID<int64_t, 0>(v) {}
-
-    static ZmUniqueID fromInt64(int64_t v) noexcept { return ZmUniqueID(v); }
-    /// The number at the start of \p text (`ZmString::toInt64`); null gives the empty identifier.
-    static ZmUniqueID fromLatin1(const char* text);
-    /// The decimal value.
-    ZmString toZmString() const;
+    constexpr explicit ZmUniqueID(int64_t v) noexcept : ZmInt64ID<ZmUniqueID, 0>(v) {}
 
     /// -1, 0 or 1, by the signed value.
     static int compare(const ZmUniqueID& a, const ZmUniqueID& b) noexcept

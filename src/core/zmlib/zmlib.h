@@ -26,6 +26,7 @@
 #include <zmlib/ZmHandableThreaded.h>
 #include <zmlib/ZmHandle.h>
 #include <zmlib/ZmID.h>
+#include <zmlib/ZmInt64ID.h>
 #include <zmlib/ZmInterface.h>
 #include <zmlib/ZmInterfaceOwner.h>
 #include <zmlib/ZmInterfaceOwnerDefaultImpl.h>
