@@ -220,7 +220,8 @@ TEST(FailureInjection, TokenizersAndBitFieldsThrowCleanly)
 
     const auto general = [&] {
         tokens.clear();
-        ZmStringTokenizerGeneral t(ZmString("a;b;;c"), ";");
+        const ZmString source("a;b;;c"); // the tokenizer does not copy its text
+        ZmStringTokenizerGeneral t(source, ";");
         while (t.hasMoreTokens()) {
             tokens.emplace_back(t.nextToken().getString());
         }
