@@ -12,6 +12,7 @@
 #include <atomic>
 #include <cctype>
 #include <cstdio>
+#include <cstdlib>
 #include <ctime>
 #include <filesystem>
 #include <fstream>
@@ -293,6 +294,39 @@ TEST_F(ZmLogFileTest, OpenPrunesTheOldestFilesAndTheirDumps)
     for (const char* name : {"20000104-000000-1000001.dmp", "other.txt"}) {
         EXPECT_TRUE(std::filesystem::exists(dir / name)) << name;
     }
+}
+
+// A negative limit disables the clean-up like 0, through the setter and through the environment
+// (read when the log is created: a real zmtool run, whose log lives in $TMPDIR).
+TEST_F(ZmLogFileTest, NegativeFileLimitDeletesNothing)
+{
+    ScratchDir dir;
+    const std::vector<std::string> old = {"20000101-000000-1000001.log", "20000102-000000-1000001.log"};
+    for (const std::string& name : old) {
+        std::ofstream(dir / name) << "x";
+    }
+    ZmLogFile& log = getTheLogInstance();
+    log.setBaseFolder(dir.path());
+    log.setMaxNumLogFiles(-1);
+    ASSERT_TRUE(log.open(true));
+    log.close();
+    EXPECT_EQ(logFiles(dir.path()).size(), old.size() + 1);
+
+    const char* tool = std::getenv("ZMTOOL");
+    if (tool == nullptr || tool[0] == 0) {
+        GTEST_SKIP() << "ZMTOOL is not set (the test build sets it to the built zmtool)";
+    }
+    const std::string demoLogs = dir / "zmtool-logs"; // the demo's log folder under $TMPDIR
+    std::filesystem::create_directory(demoLogs);
+    for (const std::string& name : old) {
+        std::ofstream(demoLogs + "/" + name) << "x";
+    }
+    const std::string command =
+        "TMPDIR='" + dir.path() + "/' KORVO_MAXNUMLOGFILES=-3 '" + tool + "' demo >/dev/null 2>&1";
+    ASSERT_EQ(std::system(command.c_str()), 0);
+    const std::vector<std::string> left = logFiles(demoLogs);
+    EXPECT_EQ(left.size(), old.size() + 1) << "the demo's own log joins the two";
+    EXPECT_TRUE(std::includes(left.begin(), left.end(), old.begin(), old.end()));
 }
 
 TEST_F(ZmLogFileTest, UnwritableFolderKeepsOutputOnStandardOutput)

@@ -547,7 +547,9 @@ namespace {
 
 void cleanUpLocked(ZmLogFilePrivate& d, const ZmString* keep)
 {
-    if (d.maxNumLogFiles == 0 || d.dateFoldersEnabled) {
+    // A negative limit (a typo in the environment, a bad setter call) means no clean-up, like 0:
+    // read as a count it would make every log file of the folder "excess".
+    if (d.maxNumLogFiles <= 0 || d.dateFoldersEnabled) {
         return;
     }
     ZmString folder(d.baseFolder.c_str());

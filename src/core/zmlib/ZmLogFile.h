@@ -112,6 +112,8 @@ public:
 
     ZmLogLevel logLevel() const;
     void setLogLevel(ZmLogLevel level);
+    /// How many log files the clean-up leaves in the base folder; 0 or a negative count (from the
+    /// setter or KORVO_MAXNUMLOGFILES) disables the clean-up.
     int64_t maxNumLogFiles() const;
     void setMaxNumLogFiles(int64_t count);
     uint64_t maxLogFileSizeInBytes() const;
