@@ -329,6 +329,35 @@ TEST_F(ZmLogFileTest, NegativeFileLimitDeletesNothing)
     EXPECT_TRUE(std::includes(left.begin(), left.end(), old.begin(), old.end()));
 }
 
+// The default module's text stays valid while another thread replaces it (it used to point into a
+// string that the next setDefaultModule freed: a use after free under ASan, a race under TSan).
+TEST_F(ZmLogFileTest, DefaultModuleTextSurvivesConcurrentChanges)
+{
+    ZmLogFile& log = getTheLogInstance();
+    const std::string names[] = {"reader", "a module name long enough to need a bigger block"};
+    std::atomic<bool> stop{false};
+    std::thread setter([&] {
+        for (int i = 0; i < 20000; ++i) {
+            log.setDefaultModule(names[i % 2].c_str());
+        }
+        stop = true;
+    });
+    int bad = 0;
+    while (!stop) {
+        const char* text = log.defaultModule();
+        const std::string copy(text); // reads the text after the lock is gone
+        bad += copy != names[0] && copy != names[1] && !copy.empty();
+        const ZmLogFileDefaultModuleModifier scoped("scoped");
+    }
+    setter.join();
+    EXPECT_EQ(bad, 0);
+    log.setDefaultModule(names[1].c_str());
+    const char* before = log.defaultModule();
+    log.setDefaultModule("another");
+    EXPECT_STREQ(before, names[1].c_str()); // the old text is still there
+    EXPECT_STREQ(log.defaultModule(), "another");
+}
+
 TEST_F(ZmLogFileTest, UnwritableFolderKeepsOutputOnStandardOutput)
 {
     ScratchDir dir;

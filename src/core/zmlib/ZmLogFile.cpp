@@ -1,6 +1,8 @@
 #include <zmlib/ZmDirectory.h>
 #include <zmlib/ZmFilename.h>
 #include <zmlib/ZmLogFile.h>
+#include <zmlib/ZmMemory.h>
+#include <zmlib/ZmMemoryException.h>
 #include <zmlib/ZmMutex.h>
 #include <zmlib/ZmTmpDir.h>
 
@@ -64,7 +66,10 @@ struct ZmLogFilePrivate {
     bool consoleToLogEnabled = false;
     bool logToConsoleEnabled = false;
     ZmLogFile::DateTimeFormat dateTimeFormat = ZmLogFile::TimeOfDay;
-    ZmString defaultModule;
+    // Points into `modules`: an interned name stays valid for the life of the process, so the
+    // text defaultModule() hands out survives any later setDefaultModule.
+    const char* defaultModule = "";
+    ZmDArray<char*> modules;
     int64_t bytesWritten = 0;
     bool relativeTime = false;
     int64_t relativeSeconds = 0;
@@ -314,7 +319,7 @@ private:
 // plain stores: this runs for every line.
 void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char* module, const timespec& now)
 {
-    const char* name = module != nullptr && module[0] != 0 ? module : d.defaultModule.getString();
+    const char* name = module != nullptr && module[0] != 0 ? module : d.defaultModule;
     const size_t nameLength = std::strlen(name);
     const int64_t need = int64_t(kMaxStamp + 8 + nameLength);
     if (line.getMax() < need) {
@@ -694,13 +699,41 @@ void ZmLogFile::setBaseFolder(const std::string& folder)
 const char* ZmLogFile::defaultModule() const
 {
     ZmMutexLocker lock(m_d->mutex);
-    return m_d->defaultModule.getString();
+    return m_d->defaultModule;
 }
 
 void ZmLogFile::setDefaultModule(const char* module)
 {
     ZmMutexLocker lock(m_d->mutex);
-    m_d->defaultModule = module;
+    if (module == nullptr || module[0] == 0) {
+        m_d->defaultModule = "";
+        return;
+    }
+    ZmDArray<char*>& modules = m_d->modules;
+    for (char* known : modules) {
+        if (std::strcmp(known, module) == 0) {
+            m_d->defaultModule = known;
+            return;
+        }
+    }
+    // A new name is interned and never freed. Module names are a small fixed set in practice;
+    // one that keeps growing is worth a warning, once.
+    static constexpr int64_t kManyModules = 1024;
+    try {
+        const size_t n = std::strlen(module) + 1;
+        modules.remax(modules.size() + 1, -1); // room first: the copy below cannot be lost
+        char* copy = static_cast<char*>(zmmalloc(n));
+        std::memcpy(copy, module, n);
+        modules.append(copy);
+        m_d->defaultModule = copy;
+    } catch (const ZmMemoryException&) {
+        return; // the log never throws: the old default module stays
+    }
+    if (modules.size() == kManyModules) {
+        warnf("ZmLogFile::setDefaultModule(): %lld distinct module names are kept for the life of "
+              "the process; module names should be a fixed set\n",
+              static_cast<long long>(kManyModules));
+    }
 }
 
 ZmLogFile::WriteCallback ZmLogFile::writeCallback() const
@@ -750,14 +783,14 @@ void ZmLogFile::timeString(ZmString& out, DateTimeFormat format) const
 // --- helpers -----------------------------------------------------------------------------------
 
 ZmLogFileDefaultModuleModifier::ZmLogFileDefaultModuleModifier(const char* module)
-    : m_previous(getTheLogInstance().defaultModule())
+    : m_previous(getTheLogInstance().defaultModule()) // interned: stays valid
 {
     getTheLogInstance().setDefaultModule(module);
 }
 
 ZmLogFileDefaultModuleModifier::~ZmLogFileDefaultModuleModifier()
 {
-    getTheLogInstance().setDefaultModule(m_previous.getString());
+    getTheLogInstance().setDefaultModule(m_previous);
 }
 
 void ZmLogFileWriteCallbackDisabler::disableWriteCallback()

@@ -131,6 +131,8 @@ public:
     DateTimeFormat dateTimeFormat() const;
     void setDateTimeFormat(DateTimeFormat format);
     /// The module used when a call gives none (the returned text is valid until it is changed).
+    /// The module named by lines that give none ("" when unset). The text stays valid for the life
+    /// of the process, whatever is set later: names are interned, so keep them a fixed set.
     const char* defaultModule() const;
     void setDefaultModule(const char* module);
     WriteCallback writeCallback() const;
@@ -164,7 +166,7 @@ public:
     ZmLogFileDefaultModuleModifier& operator=(const ZmLogFileDefaultModuleModifier&) = delete;
 
 private:
-    ZmString m_previous;
+    const char* m_previous;
 };
 
 /// Takes the write callback away and gives it back, keeping its level.
