@@ -1,61 +1,9 @@
 #include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmMutex.h>
-#include <zmlib/ZmMutex_p.h>
 
-ZmMutex::ZmMutex(bool recursive) : m_d(new ZmMutexPrivate)
-{
-    m_d->recursive = recursive;
-    pthread_mutexattr_t attr;
-    pthread_mutexattr_init(&attr);
-    pthread_mutexattr_settype(&attr, recursive ? PTHREAD_MUTEX_RECURSIVE : PTHREAD_MUTEX_NORMAL);
-    pthread_mutex_init(&m_d->mutex, &attr);
-    pthread_mutexattr_destroy(&attr);
-}
-
-ZmMutex::~ZmMutex()
-{
-    pthread_mutex_destroy(&m_d->mutex);
-    delete m_d;
-}
-
-bool ZmMutex::tryLock()
-{
-    return pthread_mutex_trylock(&m_d->mutex) == 0;
-}
+// The portable part of ZmMutex; the platform calls are in ZmMutex_posix.cpp.
 
 void ZmMutex::unlockFailed(int rc)
 {
     getTheLogInstance().errorf("ZmMutex::unlock() failed (error code: %d)\n", rc);
 }
-
-#if defined(__GNUC__) && !defined(__clang__) && defined(__x86_64__)
-// Jump to the platform through its address-table entry rather than through a linker stub: one jump
-// less on the hottest path of every lock.
-extern "C" int pthread_mutex_lock(pthread_mutex_t*) noexcept __attribute__((noplt));
-extern "C" int pthread_mutex_unlock(pthread_mutex_t*) noexcept __attribute__((noplt));
-#endif
-
-namespace {
-// The mutex is the first member, so each of these compiles to a single jump into the platform.
-int lockCall(ZmMutexPrivate* d)
-{
-    return pthread_mutex_lock(&d->mutex);
-}
-int unlockCall(ZmMutexPrivate* d)
-{
-    return pthread_mutex_unlock(&d->mutex);
-}
-} // namespace
-
-int (*const zmMutexLockCall)(ZmMutexPrivate*) = &lockCall;
-int (*const zmMutexUnlockCall)(ZmMutexPrivate*) = &unlockCall;
-
-bool ZmMutex::isRecursive() const
-{
-    return m_d->recursive;
-}
-
-// A constant-initialised global would be nicer, but the mutex is a pimpl like every other; its
-// constructor only allocates and initialises, so static initialisation order cannot bite: nothing
-// in the library locks it during static initialisation.
-ZmMutex ZmSingleton_Mutex;

@@ -4,7 +4,11 @@
 
 #include <pthread.h>
 
+/// Selects the constant constructor of ZmMutex.
+struct ZmMutexStaticPart {};
+
 struct ZmMutexPrivate {
-    pthread_mutex_t mutex;
+    pthread_mutex_t mutex; // first: the lock and unlock calls pass its address on unchanged
     bool recursive;
+    bool isStatic; // the singleton's part, in static storage: never destroyed
 };

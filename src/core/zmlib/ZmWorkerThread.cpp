@@ -113,7 +113,9 @@ void ZmWorkerThread::computeCtor()
 void ZmWorkerThread::computeDtor()
 {}
 
-bool ZmWorkerThread::start(bool synchronous)
+// The caller mutex is taken only for a synchronous start (the worker protocol's one nested lock),
+// a conditional locking the lock analysis cannot follow.
+bool ZmWorkerThread::start(bool synchronous) ZM_NO_THREAD_SAFETY_ANALYSIS
 {
     ZmWorkerThreadPrivate* d = m_d;
     d->jobsRequested.fetch_add(1, std::memory_order_relaxed);
