@@ -11,6 +11,7 @@
 #include <atomic>
 #include <chrono>
 #include <cstdlib>
+#include <ctime>
 #include <functional>
 #include <memory>
 #include <string>
@@ -202,6 +203,59 @@ TEST(ZmWaitCondition, TimesOutAndCopiesWakeTheSameWaiters)
     joinAll(waiters);
     EXPECT_EQ(woken, 3);
     EXPECT_FALSE(timedOut);
+}
+
+// The wall clock as the library sees it can be stepped: this program's clock_gettime wins over the
+// C library's for every caller in the process, the shared library included, and moves
+// CLOCK_REALTIME while g_wallClockStep is set. The real clock comes from the system call itself.
+namespace {
+std::atomic<long> g_wallClockStep{0}; // seconds added to CLOCK_REALTIME
+} // namespace
+
+extern "C" int clock_gettime(clockid_t clock, struct timespec* ts) noexcept
+{
+    const long rc = syscall(SYS_clock_gettime, clock, ts);
+    if (rc == 0 && clock == CLOCK_REALTIME) {
+        ts->tv_sec += g_wallClockStep.load();
+    }
+    return int(rc);
+}
+
+// A step of the wall clock must not stretch a time-out: waits follow the monotonic clock. (On the
+// wall clock, the 200 ms wait below would last an hour.)
+TEST(ZmWaitCondition, TimeOutsIgnoreWallClockSteps)
+{
+    timespec probe{};
+    g_wallClockStep = 3600;
+    const time_t stepped = (clock_gettime(CLOCK_REALTIME, &probe), probe.tv_sec);
+    g_wallClockStep = 0;
+    if (stepped < std::time(nullptr) + 3000) {
+        GTEST_SKIP() << "clock_gettime cannot be interposed in this build";
+    }
+    ZmMutex mutex;
+    ZmWaitCondition condition;
+    std::atomic<bool> done{false};
+    double waitedMs = -1;
+    g_wallClockStep = 3600;
+    std::thread waiter([&] {
+        ZmMutexLocker lock(mutex);
+        const Clock::time_point start = Clock::now();
+        EXPECT_FALSE(condition.wait(&mutex, 200));
+        waitedMs = msSince(start);
+        done = true;
+    });
+    for (int i = 0; i < 500 && !done; ++i) {
+        ZmThread::msleep(10);
+    }
+    g_wallClockStep = 0;
+    const bool endedInTime = done;
+    while (!done) { // release a waiter stuck on the stepped clock, so the test ends either way
+        condition.wakeAll();
+        ZmThread::msleep(1);
+    }
+    waiter.join();
+    EXPECT_TRUE(endedInTime) << "a 200 ms wait was still waiting after 5 s";
+    EXPECT_GE(waitedMs, 199);
 }
 
 namespace {

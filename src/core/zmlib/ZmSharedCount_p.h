@@ -16,3 +16,32 @@ public:
 private:
     std::atomic<int> m_refs{1};
 };
+
+/// The copy, assignment and release of a class whose copies share one private part \p P, written
+/// once: \p P has a `ZmSharedCount refs` and a `static void destroy(P*)` that tears the part down
+/// and deletes it. The last holder destroys; a self-assignment changes nothing.
+template <class P>
+struct ZmSharedPart {
+    /// For a copy constructor: one more holder of \p d.
+    static P* share(P* d) noexcept
+    {
+        d->refs.ref();
+        return d;
+    }
+    /// For an assignment: \p mine lets go of its part and shares \p other.
+    static void assign(P*& mine, P* other) noexcept
+    {
+        if (mine != other) {
+            other->refs.ref();
+            release(mine);
+            mine = other;
+        }
+    }
+    /// For a destructor (and any other holder letting go).
+    static void release(P* d) noexcept
+    {
+        if (d->refs.unref()) {
+            P::destroy(d);
+        }
+    }
+};

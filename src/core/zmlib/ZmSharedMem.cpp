@@ -37,6 +37,8 @@ struct ZmSharedMemPrivate {
     /// The process that took the lock: a child that inherited the object by fork() shares that
     /// lock with its parent and must not release it.
     pid_t holderPid = 0;
+
+    static void destroy(ZmSharedMemPrivate* d);
 };
 
 namespace {
@@ -206,36 +208,30 @@ bool attach(ZmSharedMemPrivate& d, const char* name, uint64_t size)
     return false;
 }
 
-void unref(ZmSharedMemPrivate* d)
-{
-    if (d->refs.unref()) {
-        release(*d);
-        delete d;
-    }
-}
-
 } // namespace
+
+void ZmSharedMemPrivate::destroy(ZmSharedMemPrivate* d)
+{
+    release(*d);
+    delete d;
+}
 
 ZmSharedMem::ZmSharedMem() : m_d(new ZmSharedMemPrivate)
 {}
 
 // Copies share the attachment on purpose: both return the same view, and the last one releases it.
-ZmSharedMem::ZmSharedMem(const ZmSharedMem& other) : m_d(other.m_d)
-{
-    m_d->refs.ref();
-}
+ZmSharedMem::ZmSharedMem(const ZmSharedMem& other) : m_d(ZmSharedPart<ZmSharedMemPrivate>::share(other.m_d))
+{}
 
 ZmSharedMem& ZmSharedMem::operator=(const ZmSharedMem& other)
 {
-    other.m_d->refs.ref();
-    unref(m_d);
-    m_d = other.m_d;
+    ZmSharedPart<ZmSharedMemPrivate>::assign(m_d, other.m_d);
     return *this;
 }
 
 ZmSharedMem::~ZmSharedMem()
 {
-    unref(m_d);
+    ZmSharedPart<ZmSharedMemPrivate>::release(m_d);
 }
 
 char* ZmSharedMem::buffer(const char* name, uint64_t size)

@@ -49,15 +49,13 @@ struct ZmThreadPrivate {
     // Every ZmThread sharing this part holds one reference, and so does a run that is going.
     ZmSharedCount refs;
 
-    void release()
+    static void destroy(ZmThreadPrivate* d)
     {
-        if (refs.unref()) {
-            const int rc = pthread_attr_destroy(&attr);
-            if (rc != 0) {
-                getTheLogInstance().errorf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
-            }
-            delete this;
+        const int rc = pthread_attr_destroy(&d->attr);
+        if (rc != 0) {
+            getTheLogInstance().errorf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
         }
+        delete d;
     }
 };
 
@@ -81,22 +79,18 @@ ZmThread::ZmThread(const char* name) : m_d(new ZmThreadPrivate)
 }
 
 // Copies share the thread on purpose: the copy and the source are the same thread.
-ZmThread::ZmThread(const ZmThread& other) : m_d(other.m_d)
-{
-    m_d->refs.ref();
-}
+ZmThread::ZmThread(const ZmThread& other) : m_d(ZmSharedPart<ZmThreadPrivate>::share(other.m_d))
+{}
 
 ZmThread& ZmThread::operator=(const ZmThread& other)
 {
-    other.m_d->refs.ref();
-    m_d->release();
-    m_d = other.m_d;
+    ZmSharedPart<ZmThreadPrivate>::assign(m_d, other.m_d);
     return *this;
 }
 
 ZmThread::~ZmThread()
 {
-    m_d->release();
+    ZmSharedPart<ZmThreadPrivate>::release(m_d);
 }
 
 void* ZmThread::trampoline(void* arg)
@@ -108,7 +102,7 @@ void* ZmThread::trampoline(void* arg)
     d->finished.wakeAll();
     d->stateMutex.unlock();
     // The run's own reference: the object may have been destroyed once its body returned.
-    d->release();
+    ZmSharedPart<ZmThreadPrivate>::release(d);
     return nullptr;
 }
 

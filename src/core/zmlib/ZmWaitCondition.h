@@ -20,7 +20,7 @@ public:
     ZmWaitCondition& operator=(const ZmWaitCondition& other);
     virtual ~ZmWaitCondition();
 
-    /// Releases \p mutex, waits for a wake or for \p ms milliseconds of wall-clock time (4294967295
+    /// Releases \p mutex, waits for a wake or for \p ms milliseconds of monotonic time (4294967295
     /// and more: no limit) and locks \p mutex again. True when woken, false on time-out or failure.
     bool wait(ZmMutex* mutex, unsigned long ms = 4294967295UL);
     void wakeOne();

@@ -4,7 +4,7 @@
 
 #include <time.h>
 
-/// The absolute deadline of a wait of \p ms milliseconds that starts at the wall-clock time \p now.
+/// The absolute deadline of a wait of \p ms milliseconds that starts at the monotonic time \p now.
 /// The clock is taken in whole milliseconds first, so a deadline may come up to 1 ms early; that
 /// truncation is intended (it keeps the arithmetic of the original millisecond clock).
 inline timespec zmWaitConditionDeadline(const timespec& now, unsigned long ms)

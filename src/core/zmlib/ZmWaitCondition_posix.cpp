@@ -1,3 +1,4 @@
+// ZmWaitCondition is a thin layer over the POSIX condition variable: all of it is platform code.
 #include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmMutex.h>
 #include <zmlib/ZmMutex_p.h>
@@ -10,49 +11,49 @@
 struct ZmWaitConditionPrivate {
     pthread_cond_t cond;
     ZmSharedCount refs;
-};
 
-namespace {
-
-void release(ZmWaitConditionPrivate* d)
-{
-    if (d->refs.unref()) {
+    static void destroy(ZmWaitConditionPrivate* d)
+    {
         const int rc = pthread_cond_destroy(&d->cond);
         if (rc != 0) {
             getTheLogInstance().errorf("ZmWaitCondition::~ZmWaitCondition() failed (error code: %d)\n", rc);
         }
         delete d;
     }
-}
-
-} // namespace
+};
 
 ZmWaitCondition::ZmWaitCondition() : m_d(new ZmWaitConditionPrivate)
 {
-    // Default attributes: the condition measures deadlines on the wall clock.
-    const int rc = pthread_cond_init(&m_d->cond, nullptr);
+    // Deadlines are measured on the monotonic clock: a step of the wall clock (an administrator, a
+    // time daemon) must neither stretch nor cut a time-out.
+    pthread_condattr_t attr;
+    int rc = pthread_condattr_init(&attr);
+    if (rc == 0) {
+        rc = pthread_condattr_setclock(&attr, CLOCK_MONOTONIC);
+        if (rc == 0) {
+            rc = pthread_cond_init(&m_d->cond, &attr);
+        }
+        pthread_condattr_destroy(&attr);
+    }
     if (rc != 0) {
         getTheLogInstance().errorf("ZmWaitCondition::ZmWaitCondition() failed (error code: %d)\n", rc);
     }
 }
 
 // Copies share the condition on purpose: the copy and the source are the same condition.
-ZmWaitCondition::ZmWaitCondition(const ZmWaitCondition& other) : m_d(other.m_d)
-{
-    m_d->refs.ref();
-}
+ZmWaitCondition::ZmWaitCondition(const ZmWaitCondition& other)
+    : m_d(ZmSharedPart<ZmWaitConditionPrivate>::share(other.m_d))
+{}
 
 ZmWaitCondition& ZmWaitCondition::operator=(const ZmWaitCondition& other)
 {
-    other.m_d->refs.ref();
-    release(m_d);
-    m_d = other.m_d;
+    ZmSharedPart<ZmWaitConditionPrivate>::assign(m_d, other.m_d);
     return *this;
 }
 
 ZmWaitCondition::~ZmWaitCondition()
 {
-    release(m_d);
+    ZmSharedPart<ZmWaitConditionPrivate>::release(m_d);
 }
 
 bool ZmWaitCondition::wait(ZmMutex* mutex, unsigned long ms)
@@ -67,7 +68,7 @@ bool ZmWaitCondition::wait(ZmMutex* mutex, unsigned long ms)
         return true;
     }
     timespec now;
-    clock_gettime(CLOCK_REALTIME, &now);
+    clock_gettime(CLOCK_MONOTONIC, &now);
     const timespec deadline = zmWaitConditionDeadline(now, ms);
     // Time-outs and errors alike answer false without a log line: a time-out is the normal outcome.
     return pthread_cond_timedwait(&m_d->cond, m, &deadline) == 0;
