@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <csignal>
 #include <cstring>
 #include <dirent.h>
 #include <fcntl.h>
@@ -137,29 +138,65 @@ TEST_F(ZmSharedMemTest, BlockLivesWhileAnyProcessHoldsIt)
     EXPECT_STREQ(p + 128, "from the child");
     EXPECT_EQ(shmEntries(token).size(), 1u);
 
-    // A holder that dies without letting go leaves its block; the next holder takes it over.
-    const std::string left = token + "-left";
-    child = fork();
-    ASSERT_GE(child, 0);
-    if (child == 0) {
+    // Holders that end without letting go (_exit after another process attached and let go, a
+    // SIGKILL) leave orphans; the next attach of any block reclaims them, never a held one.
+    const std::string left = token + "-left", killed = token + "-killed", held = token + "-held";
+    int ready[2], release[2];
+    ASSERT_EQ(pipe(ready), 0);
+    ASSERT_EQ(pipe(release), 0);
+    const pid_t exiting = fork();
+    if (exiting == 0) {
         char* c = (new ZmSharedMem)->buffer(left.c_str(), 3 * page);
-        if (c != nullptr) {
-            std::strcpy(c, "left behind");
-        }
-        _exit(c != nullptr ? 0 : 1);
+        std::strcpy(c, "left behind");
+        (void)!write(ready[1], "x", 1);
+        char go = 0;
+        (void)!read(release[0], &go, 1); // the parent attaches and lets go meanwhile
+        _exit(0);
     }
-    ASSERT_EQ(exitCode(child), 0);
-    ASSERT_EQ(shmEntries(left).size(), 1u);
+    char byte = 0;
+    ASSERT_EQ(read(ready[0], &byte, 1), 1);
     {
-        ZmSharedMem next;
-        char* q = next.buffer(left.c_str(), 1);
-        ASSERT_NE(q, nullptr);
-        EXPECT_STREQ(q, "left behind");
-        EXPECT_EQ(shmEntries(left)[0].second, 4 * page); // the creator's size
+        ZmSharedMem visitor;
+        ASSERT_NE(visitor.buffer(left.c_str(), 1), nullptr);
     }
+    ASSERT_EQ(write(release[1], "x", 1), 1);
+    ASSERT_EQ(exitCode(exiting), 0);
+    // An orphan now (unless another process attached meanwhile); the attaches below reclaim it.
+    const pid_t victim = fork(), holder = victim == 0 ? 0 : fork();
+    if (victim == 0 || holder == 0) {
+        char* c = (new ZmSharedMem)->buffer((victim == 0 ? killed : held).c_str(), 1);
+        std::strcpy(c, "still here");
+        (void)!write(ready[1], "x", 1);
+        (void)!read(release[0], &byte, 1); // the victim is killed while it waits here
+        _exit(0);
+    }
+    // No fatal assertion until the holder is released: it must not be left waiting.
+    EXPECT_EQ(read(ready[0], &byte, 1), 1);
+    EXPECT_EQ(read(ready[0], &byte, 1), 1);
+    kill(victim, SIGKILL);
+    waitpid(victim, nullptr, 0);
     EXPECT_TRUE(shmEntries(left).empty());
+    {
+        ZmSharedMem unrelated;
+        EXPECT_NE(unrelated.buffer((token + "-unrelated").c_str(), 1), nullptr);
+        EXPECT_TRUE(shmEntries(killed).empty());
+        ZmSharedMem same;
+        const char* q = same.buffer(held.c_str(), 1); // held by the live child: the same block
+        EXPECT_TRUE(q != nullptr && std::strcmp(q, "still here") == 0);
+        ZmSharedMem fresh;
+        const char* f = fresh.buffer(left.c_str(), 1); // a reclaimed name starts afresh
+        EXPECT_TRUE(f != nullptr && f[0] == 0);
+    }
+    ASSERT_EQ(write(release[1], "x", 1), 1);
+    EXPECT_EQ(exitCode(holder), 0);
+    for (int fd : {ready[0], ready[1], release[0], release[1]}) {
+        close(fd);
+    }
+    EXPECT_TRUE(shmEntries(left).empty()); // its last holder let go normally
+    // The holder _exited holding its block: an orphan the next attach reclaims (checked when the
+    // test ends).
 
-    // One whose creator died before sizing it stays empty; it is replaced after a short wait.
+    // One whose creator died before sizing it is empty and unlocked: reclaimed like any orphan.
     const int fd = shm_open(("/zmshm." + left).c_str(), O_RDWR | O_CREAT | O_EXCL, 0600);
     ASSERT_GE(fd, 0);
     close(fd);

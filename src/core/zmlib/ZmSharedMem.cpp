@@ -4,9 +4,12 @@
 // file locks: every process that has a block mapped keeps the object's descriptor open with a
 // shared flock(). A holder that lets go drops its lock and tries for an exclusive one without
 // waiting; it gets it only when no other holder is left, and then unlinks the name. The kernel
-// drops the lock of a process that dies, so a crash never leaves a count wrong; an object is left
-// behind only when the last holder dies without letting go, and the next process to use that
-// name takes it over and removes it when it is done.
+// drops the lock of a process that dies, so a crash never leaves a count wrong. When the last
+// holder dies without letting go (a crash, _exit, a kill) its object is an orphan: linked, held by
+// nobody. Every attach first reclaims the orphans of the library's prefix, so such a block goes
+// away at the next use of any block, as a mapping goes with its last handle elsewhere. An object
+// is reclaimed only under an exclusive lock, which no holder's shared lock allows; an opener that
+// has not taken its shared lock yet is covered by the check below.
 //
 // A process that opens a name can race with one that is removing it; so, once its shared lock is
 // taken, every opener checks that the object is still linked and starts over when it is not. An
@@ -18,6 +21,8 @@
 #include <zmlib/ZmString.h>
 
 #include <cerrno>
+#include <cstring>
+#include <dirent.h>
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/mman.h>
@@ -43,6 +48,10 @@ struct ZmSharedMemPrivate {
 
 namespace {
 
+/// Where the system shows its shared-memory objects, and the prefix of the library's own.
+constexpr char kObjectDir[] = "/dev/shm";
+constexpr char kPrefix[] = "zmshm.";
+
 /// Longest mapped name; the component after '/' may have at most 255 bytes.
 constexpr int kMaxObjectName = 200;
 /// Tries before giving up on a name that keeps changing under us.
@@ -53,7 +62,8 @@ constexpr int kStaleAfter = 200;
 ZmString objectName(const char* name)
 {
     static const char hex[] = "0123456789ABCDEF";
-    ZmString out("/zmshm.");
+    ZmString out("/");
+    out += kPrefix;
     for (const unsigned char* p = reinterpret_cast<const unsigned char*>(name); *p != 0; ++p) {
         const unsigned char c = *p;
         if ((c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '.' ||
@@ -120,6 +130,37 @@ void release(ZmSharedMemPrivate& d)
     d.fd = -1;
 }
 
+/// Unlinks every object of the library's prefix that no process holds. Each is taken under an
+/// exclusive lock without waiting, which fails while any holder keeps its shared lock, and is
+/// unlinked only while still linked (another process may have removed it, and a new object of the
+/// same name is another file). A creator or opener that opened an object but has not locked it
+/// yet finds it unlinked once it holds its lock, and starts over.
+void reclaimOrphans()
+{
+    DIR* dir = opendir(kObjectDir);
+    if (dir == nullptr) {
+        return;
+    }
+    const size_t prefixLength = sizeof kPrefix - 1;
+    while (const dirent* e = readdir(dir)) {
+        if (std::strncmp(e->d_name, kPrefix, prefixLength) != 0) {
+            continue;
+        }
+        ZmString object("/");
+        object += e->d_name;
+        const int fd = shm_open(object.getString(), O_RDWR | O_NOFOLLOW, 0);
+        if (fd < 0) {
+            continue; // gone already, or another user's
+        }
+        struct stat st;
+        if (lockFile(fd, LOCK_EX | LOCK_NB) == 0 && fstat(fd, &st) == 0 && st.st_nlink > 0) {
+            shm_unlink(object.getString());
+        }
+        close(fd);
+    }
+    closedir(dir);
+}
+
 bool attachAnonymous(ZmSharedMemPrivate& d, uint64_t bytes)
 {
     void* view = mmap(nullptr, bytes, PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
@@ -145,6 +186,7 @@ bool attach(ZmSharedMemPrivate& d, const char* name, uint64_t size)
     if (name == nullptr || name[0] == 0) {
         return attachAnonymous(d, bytes);
     }
+    reclaimOrphans();
     const ZmString object = objectName(name);
     const char* objectPath = object.getString();
     int emptySeen = 0;
