@@ -2,6 +2,7 @@
 
 #include <zmlib/ZmRotation.h>
 
+#include "ZmGeometryKernels_p.h"
 #include "ZmGeometryText_p.h"
 
 #include <cmath>
@@ -308,4 +309,9 @@ std::string ZmMat4f::dump() const
     std::string out;
     zmgeom::appendJsonObject(out, keys, &m_m[0][0], 16);
     return out;
+}
+
+int ZmMat4f::affineInverseKernel(const ZmMat4f& in, ZmMat4f& out) noexcept
+{
+    return ZmGeometryKernels::affineInverse(&in.m_m[0][0], &out.m_m[0][0]);
 }

@@ -11,9 +11,6 @@
 #include <cstdio>
 #include <string>
 
-// SSE2 is part of every x86-64 processor, the only target this library builds for.
-#include <emmintrin.h>
-
 class ZmRotation;
 
 /// A 4x4 matrix of floats stored row by row (`m[row][column]`, 64 bytes): the affine and
@@ -243,7 +240,7 @@ public:
     {
         if (in.m_m[0][3] != 0.0f || in.m_m[1][3] != 0.0f || in.m_m[2][3] != 0.0f || in.m_m[3][3] != 1.0f)
             return 0;
-        return affineInverseSse2(in, out);
+        return affineInverseKernel(in, out);
     }
     /// LU decomposition in place with partial pivoting and implicit row scaling. Never fails and
     /// always returns 1, intended: an all-zero row gets 1e-6 on its diagonal and a zero pivot
@@ -274,68 +271,9 @@ private:
     /// The general inverse, through LUDecomposition and LUBackSubstitution.
     ZmMat4f inverseByLU() const noexcept;
 
-    // The columns of the upper inverse are the cross products of the rows (r1 x r2, r2 x r0,
-    // r0 x r1); the determinant's products are (r0 * r1.yzx) * r2.zxy and (r0.zxy * r1.yzx) * r2,
-    // with pos and neg summed ((p0, n0) + (p2, n2)) + (p1, n1).
-    static int affineInverseSse2(const ZmMat4f& in, ZmMat4f& out) noexcept
-    {
-        const __m128 r0 = _mm_loadu_ps(in.m_m[0]), r1 = _mm_loadu_ps(in.m_m[1]), r2 = _mm_loadu_ps(in.m_m[2]);
-        const __m128 r0yzx = yzx(r0), r1yzx = yzx(r1), r2yzx = yzx(r2);
-        const __m128 r0zxy = zxy(r0), r1zxy = zxy(r1), r2zxy = zxy(r2);
-        const __m128d zero = _mm_setzero_pd();
-
-        // Lanes (p0, p1, p2, 0) and (n0, n1, n2, 0) of the positive and the negative terms
-        // p0 = a00 a11 a22, ... and n0 = a02 a11 a20, ... (column 3 is 0).
-        const __m128 p = _mm_mul_ps(_mm_mul_ps(r0, r1yzx), r2zxy);
-        const __m128 n = _mm_mul_ps(_mm_mul_ps(r0zxy, r1yzx), r2);
-        // The term -n counts max(0, -n) = -min(0, n) towards pos and min(0, -n) = -max(0, n)
-        // towards neg; subtracting a value of the right sign is exact addition.
-        const __m128d p01 = _mm_cvtps_pd(p), p2 = _mm_cvtps_pd(_mm_movehl_ps(p, p));
-        const __m128d n01 = _mm_cvtps_pd(n), n2 = _mm_cvtps_pd(_mm_movehl_ps(n, n));
-        const __m128d pos2 = _mm_add_pd(_mm_sub_pd(_mm_max_pd(zero, p01), _mm_min_pd(zero, n01)),
-                                        _mm_sub_pd(_mm_max_pd(zero, p2), _mm_min_pd(zero, n2)));
-        const __m128d neg2 = _mm_add_pd(_mm_sub_pd(_mm_min_pd(zero, p01), _mm_max_pd(zero, n01)),
-                                        _mm_sub_pd(_mm_min_pd(zero, p2), _mm_max_pd(zero, n2)));
-        // Lane 0 holds the terms of p0, n0, p2, n2, lane 1 those of p1, n1 (plus zeros).
-        const double pos = _mm_cvtsd_f64(pos2) + _mm_cvtsd_f64(_mm_unpackhi_pd(pos2, pos2));
-        const double neg = _mm_cvtsd_f64(neg2) + _mm_cvtsd_f64(_mm_unpackhi_pd(neg2, neg2));
-        const double det = pos + neg;
-        // (1 / det, det / (pos - neg)) in one division.
-        const __m128d q = _mm_div_pd(_mm_set_pd(det, 1.0), _mm_set_pd(pos - neg, det));
-        if (det == 0.0 || std::fabs(_mm_cvtsd_f64(_mm_unpackhi_pd(q, q))) < 1e-15)
-            return 0;
-        const __m128d inv = _mm_unpacklo_pd(q, q);
-
-        // Columns of the upper inverse.
-        __m128 c0 = adjugateColumn(_mm_mul_ps(r1yzx, r2zxy), _mm_mul_ps(r1zxy, r2yzx), inv);
-        __m128 c1 = adjugateColumn(_mm_mul_ps(r2yzx, r0zxy), _mm_mul_ps(r2zxy, r0yzx), inv);
-        __m128 c2 = adjugateColumn(_mm_mul_ps(r0yzx, r1zxy), _mm_mul_ps(r0zxy, r1yzx), inv);
-        __m128 c3 = _mm_setzero_ps();
-        _MM_TRANSPOSE4_PS(c0, c1, c2, c3); // now rows, with 0 in column 3
-
-        const float* t = in.m_m[3];
-        __m128 row3 =
-            _mm_add_ps(_mm_add_ps(_mm_mul_ps(_mm_set1_ps(t[0]), c0), _mm_mul_ps(_mm_set1_ps(t[1]), c1)),
-                       _mm_mul_ps(_mm_set1_ps(t[2]), c2));
-        row3 = _mm_xor_ps(row3, _mm_set1_ps(-0.0f));
-        const __m128 xyzMask = _mm_castsi128_ps(_mm_set_epi32(0, -1, -1, -1));
-        row3 = _mm_or_ps(_mm_and_ps(row3, xyzMask), _mm_set_ps(1.0f, 0.0f, 0.0f, 0.0f));
-        _mm_storeu_ps(out.m_m[0], c0);
-        _mm_storeu_ps(out.m_m[1], c1);
-        _mm_storeu_ps(out.m_m[2], c2);
-        _mm_storeu_ps(out.m_m[3], row3);
-        return 1;
-    }
-    static __m128 yzx(__m128 v) noexcept { return _mm_shuffle_ps(v, v, _MM_SHUFFLE(3, 0, 2, 1)); }
-    static __m128 zxy(__m128 v) noexcept { return _mm_shuffle_ps(v, v, _MM_SHUFFLE(3, 1, 0, 2)); }
-    /// float((double(p) - double(q)) * inv) per lane.
-    static __m128 adjugateColumn(__m128 p, __m128 q, __m128d inv) noexcept
-    {
-        const __m128d lo = _mm_mul_pd(_mm_sub_pd(_mm_cvtps_pd(p), _mm_cvtps_pd(q)), inv);
-        const __m128d hi =
-            _mm_mul_pd(_mm_sub_pd(_mm_cvtps_pd(_mm_movehl_ps(p, p)), _mm_cvtps_pd(_mm_movehl_ps(q, q))), inv);
-        return _mm_movelh_ps(_mm_cvtpd_ps(lo), _mm_cvtpd_ps(hi));
-    }
+    /// The affine inverse proper (ZmMat4f.cpp): SIMD where the target has it, the same bits
+    /// without.
+    static int affineInverseKernel(const ZmMat4f& in, ZmMat4f& out) noexcept;
     /// out = a * b, each element summed k = 0..3 starting from 0.0f. \p out may be \p a or \p b.
     static void product(const ZmMat4f& a, const ZmMat4f& b, ZmMat4f& out) noexcept
     {

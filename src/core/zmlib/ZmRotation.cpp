@@ -1,5 +1,6 @@
 #include <zmlib/ZmRotation.h>
 
+#include "ZmGeometryKernels_p.h"
 #include "ZmGeometryText_p.h"
 
 #include <cmath>
@@ -201,4 +202,14 @@ std::string ZmRotation::dump() const
     std::string out;
     zmgeom::appendJsonObject(out, keys, m_q, 4);
     return out;
+}
+
+void ZmRotation::normalize() noexcept
+{
+    ZmGeometryKernels::normalized(m_q, m_q);
+}
+
+void ZmRotation::compose(const float* a, const float* b, float* out) noexcept
+{
+    ZmGeometryKernels::compose(a, b, out);
 }

@@ -10,8 +10,6 @@
 #include <cmath>
 #include <string>
 
-#include <emmintrin.h> // SSE2: every x86-64 processor, the only target of this library
-
 /// A rotation as a unit quaternion of four floats stored x, y, z, w (vector part first, 16 bytes);
 /// the rotation of angle a about the unit axis n is (n * sin(a/2), cos(a/2)). Rotations act on
 /// row vectors like the matrices: `v * M` with `M` from `getValue(ZmMat4f&)`.
@@ -110,24 +108,8 @@ public:
     /// Composition: first this rotation, then \p q (the quaternion product q * this), normalised.
     ZmRotation& operator*=(const ZmRotation& q) noexcept
     {
-        // With this = (x, y, z, w) and q = (X, Y, Z, W), lane by lane:
-        //   x' = X w + x W + z Y - Z y,   y' = W y + w Y + x Z - X z,
-        //   z' = z W + Z w + X y - x Y,   w' = W w - X x - y Y - z Z,
-        // summed left to right (products commute exactly, adding a negated term is exact
-        // subtraction), then normalised.
-        const __m128 a = _mm_loadu_ps(m_q), b = _mm_loadu_ps(q.m_q);
-        const __m128 lane3 = _mm_set_ps(-0.0f, 0.0f, 0.0f, 0.0f); // sign bit of w only
-        const __m128 t1 = _mm_mul_ps(_mm_shuffle_ps(a, a, _MM_SHUFFLE(3, 2, 1, 3)),
-                                     _mm_shuffle_ps(b, b, _MM_SHUFFLE(3, 3, 3, 0)));
-        const __m128 t2 = _mm_mul_ps(_mm_shuffle_ps(a, a, _MM_SHUFFLE(0, 3, 3, 0)),
-                                     _mm_shuffle_ps(b, b, _MM_SHUFFLE(0, 2, 1, 3)));
-        const __m128 t3 = _mm_mul_ps(_mm_shuffle_ps(a, a, _MM_SHUFFLE(1, 1, 0, 2)),
-                                     _mm_shuffle_ps(b, b, _MM_SHUFFLE(1, 0, 2, 1)));
-        const __m128 t4 = _mm_mul_ps(_mm_shuffle_ps(a, a, _MM_SHUFFLE(2, 0, 2, 1)),
-                                     _mm_shuffle_ps(b, b, _MM_SHUFFLE(2, 1, 0, 2)));
-        const __m128 r =
-            _mm_sub_ps(_mm_add_ps(_mm_add_ps(t1, _mm_xor_ps(t2, lane3)), _mm_xor_ps(t3, lane3)), t4);
-        storeNormalized(r);
+        // The product q * this in float, normalised (ZmRotation.cpp).
+        compose(m_q, q.m_q, m_q);
         return *this;
     }
     /// \p v rotated (through the 4x4 matrix and `ZmMat4f::multVecMatrix`).
@@ -195,24 +177,12 @@ private:
     {
         return m_q[0] * m_q[0] + m_q[1] * m_q[1] + m_q[2] * m_q[2] + m_q[3] * m_q[3];
     }
-    /// Divides by the square root of `norm()`, the reciprocal taken in double.
-    void normalize() noexcept { storeNormalized(_mm_loadu_ps(m_q)); }
-    /// Stores \p v divided by its length: the squared norm summed in float in the order x, y, z,
-    /// w (as `norm()`), its square root and reciprocal in double, each product rounded to float.
-    void storeNormalized(__m128 v) noexcept
-    {
-        const __m128 sq = _mm_mul_ps(v, v);
-        const __m128 n =
-            _mm_add_ss(_mm_add_ss(_mm_add_ss(sq, _mm_shuffle_ps(sq, sq, _MM_SHUFFLE(1, 1, 1, 1))),
-                                  _mm_movehl_ps(sq, sq)),
-                       _mm_shuffle_ps(sq, sq, _MM_SHUFFLE(3, 3, 3, 3)));
-        const __m128d len = _mm_sqrt_sd(_mm_setzero_pd(), _mm_cvtss_sd(_mm_setzero_pd(), n));
-        __m128d inv = _mm_div_sd(_mm_set_sd(1.0), len);
-        inv = _mm_unpacklo_pd(inv, inv);
-        const __m128 lo = _mm_cvtpd_ps(_mm_mul_pd(_mm_cvtps_pd(v), inv));
-        const __m128 hi = _mm_cvtpd_ps(_mm_mul_pd(_mm_cvtps_pd(_mm_movehl_ps(v, v)), inv));
-        _mm_storeu_ps(m_q, _mm_movelh_ps(lo, hi));
-    }
+    /// Divides by the square root of `norm()`, the reciprocal taken in double, each product
+    /// rounded to float (ZmRotation.cpp).
+    void normalize() noexcept;
+    /// \p out = (\p b * \p a) / |\p b * \p a|: products and sums in float, the reciprocal length
+    /// in double. \p out may be either operand.
+    static void compose(const float* a, const float* b, float* out) noexcept;
 
     float m_q[4];
 };
