@@ -1,10 +1,7 @@
 #include <zmlib/ZmUUID.h>
+#include <zmlib/ZmUUID_p.h>
 
-#include <cerrno>
 #include <cstddef>
-#include <fcntl.h>
-#include <sys/random.h>
-#include <unistd.h>
 
 namespace {
 
@@ -59,70 +56,16 @@ ZmUUID parseHex(At at)
     return fromBytes(bytes);
 }
 
-// Fills \p n bytes from the kernel's random source; false if it cannot.
-bool kernelRandom(unsigned char* out, size_t n)
-{
-    size_t got = 0;
-    while (got < n) {
-        const ssize_t r = getrandom(out + got, n - got, 0);
-        if (r < 0) {
-            if (errno == EINTR) {
-                continue;
-            }
-            return false;
-        }
-        got += size_t(r);
-    }
-    return true;
-}
-
-// Reads exactly \p n bytes from \p fd; false on failure or end of file.
-bool readFully(int fd, unsigned char* out, size_t n)
-{
-    size_t got = 0;
-    while (got < n) {
-        const ssize_t r = read(fd, out + got, n - got);
-        if (r < 0 && errno == EINTR) {
-            continue;
-        }
-        if (r <= 0) {
-            return false;
-        }
-        got += size_t(r);
-    }
-    return true;
-}
-
-// The fallback when the kernel call is not available: four bytes at a time from /dev/urandom,
-// from the last four bytes to the first, stopping at the first failure. Returns how many bytes
-// were filled.
-int fallbackRandom(unsigned char (&bytes)[16])
-{
-    int filled = 0;
-    const int fd = open("/dev/urandom", O_RDONLY | O_CLOEXEC);
-    if (fd < 0) {
-        return 0;
-    }
-    for (int pos = 12; pos >= 0; pos -= 4) {
-        if (!readFully(fd, bytes + pos, 4)) {
-            break;
-        }
-        filled += 4;
-    }
-    close(fd);
-    return filled;
-}
-
 } // namespace
 
 ZmUUID ZmUUID::generateUUID()
 {
     unsigned char bytes[16] = {};
-    if (!kernelRandom(bytes, sizeof bytes)) {
+    if (!ZmUUIDPlatform::kernelRandom(bytes, sizeof bytes)) {
         for (unsigned char& b : bytes) {
             b = 0;
         }
-        if (fallbackRandom(bytes) == 0) {
+        if (ZmUUIDPlatform::fallbackRandom(bytes) == 0) {
             // Nothing random could be had: the nil UUID tells the caller, where a fixed value with
             // only the version bits would silently repeat.
             return ZmUUID();

@@ -2,7 +2,7 @@
 #include <zmlib/ZmString.h>
 #include <zmlib/ZmWatch.h>
 
-#include <time.h>
+#include "ZmMonotonicClock_p.h"
 
 std::atomic<double> ZmWatch::m_tickLength{0.0};
 
@@ -11,9 +11,7 @@ namespace {
 /// The counter: nanoseconds of the monotonic clock.
 inline int64_t counterNow()
 {
-    timespec ts;
-    clock_gettime(CLOCK_MONOTONIC, &ts);
-    return int64_t(ts.tv_sec) * 1000000000 + ts.tv_nsec;
+    return zmMonotonicNanoseconds();
 }
 
 /// The counter's frequency in ticks per second.
@@ -117,10 +115,7 @@ double ZmWatch::getTime2() const
     // the reading short: what does not need the clock is summed before, and the tick length is
     // loaded afterwards (kept across the call, it would be spilled and reloaded on the way).
     const int64_t base = m_accumulated - m_startedAt;
-    timespec ts;
-    clock_gettime(CLOCK_MONOTONIC, &ts);
-    return double(int64_t(ts.tv_sec) * 1000000000 + (ts.tv_nsec + base)) *
-           m_tickLength.load(std::memory_order_relaxed);
+    return double(zmMonotonicNanoseconds(base)) * m_tickLength.load(std::memory_order_relaxed);
 }
 
 float ZmWatch::getTime() const

@@ -1,3 +1,4 @@
+// ZmThreadLocalStorageBase is a thin layer over the POSIX thread-specific key: all platform code.
 #include <zmlib/ZmThreadLocalStorageBase.h>
 
 #include <pthread.h>
