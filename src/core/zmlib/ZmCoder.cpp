@@ -49,18 +49,18 @@ inline uint32_t rotl(uint32_t x, int s) noexcept
 // - the message word and the constant are added to a before the round function is known;
 // - I(b,c,d) = c ^ (b | ~d).
 #define ZMMD5_F(a, b, c, d, k, s, t)                                                                         \
-    a = (a + (x[k] + (t))) + ((d) ^ ((b) & ((c) ^ (d))));                                                    \
-    a = rotl(a, s) + (b)
+    (a) = ((a) + (x[k] + (t))) + ((d) ^ ((b) & ((c) ^ (d))));                                                \
+    (a) = rotl((a), (s)) + (b)
 #define ZMMD5_G(a, b, c, d, k, s, t)                                                                         \
-    a = (a + (x[k] + (t))) + ((c) & ~(d));                                                                   \
-    a += (b) & (d);                                                                                          \
-    a = rotl(a, s) + (b)
+    (a) = ((a) + (x[k] + (t))) + ((c) & ~(d));                                                               \
+    (a) += (b) & (d);                                                                                        \
+    (a) = rotl((a), (s)) + (b)
 #define ZMMD5_H(a, b, c, d, k, s, t)                                                                         \
-    a = (a + (x[k] + (t))) + (((c) ^ (d)) ^ (b));                                                            \
-    a = rotl(a, s) + (b)
+    (a) = ((a) + (x[k] + (t))) + (((c) ^ (d)) ^ (b));                                                        \
+    (a) = rotl((a), (s)) + (b)
 #define ZMMD5_I(a, b, c, d, k, s, t)                                                                         \
-    a = (a + (x[k] + (t))) + ((c) ^ ((b) | ~(d)));                                                           \
-    a = rotl(a, s) + (b)
+    (a) = ((a) + (x[k] + (t))) + ((c) ^ ((b) | ~(d)));                                                       \
+    (a) = rotl((a), (s)) + (b)
 
 void ZmCoder::md5Blocks(const unsigned char* data, size_t blocks) noexcept
 {

@@ -47,6 +47,9 @@ ZmVec3f labelDirection(const std::string& label)
     ZmVec3f d(0.0f, 0.0f, 0.0f);
     for (char c : label) {
         const int i = letterIndex(c);
+        if (i < 0) {
+            continue; // not a letter: contributes no axis
+        }
         d += ZmVec3f(kAxes[i][0], kAxes[i][1], kAxes[i][2]);
     }
     return d;

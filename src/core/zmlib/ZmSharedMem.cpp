@@ -267,7 +267,9 @@ ZmSharedMem::ZmSharedMem(const ZmSharedMem& other) : m_d(ZmSharedPart<ZmSharedMe
 
 ZmSharedMem& ZmSharedMem::operator=(const ZmSharedMem& other)
 {
-    ZmSharedPart<ZmSharedMemPrivate>::assign(m_d, other.m_d);
+    if (this != &other) {
+        ZmSharedPart<ZmSharedMemPrivate>::assign(m_d, other.m_d);
+    }
     return *this;
 }
 

@@ -84,7 +84,9 @@ ZmThread::ZmThread(const ZmThread& other) : m_d(ZmSharedPart<ZmThreadPrivate>::s
 
 ZmThread& ZmThread::operator=(const ZmThread& other)
 {
-    ZmSharedPart<ZmThreadPrivate>::assign(m_d, other.m_d);
+    if (this != &other) {
+        ZmSharedPart<ZmThreadPrivate>::assign(m_d, other.m_d);
+    }
     return *this;
 }
 

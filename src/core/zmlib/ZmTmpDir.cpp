@@ -128,7 +128,7 @@ const char* ZmTmpDir::getSystemTmpPath()
     if (dir == nullptr || dir[0] == 0 || std::strlen(dir) + 2 > sizeof(buffer)) {
         dir = "/tmp";
     }
-    std::strcpy(buffer, dir);
+    std::memcpy(buffer, dir, std::strlen(dir) + 1); // fits: checked above
     size_t n = 0;
     for (; buffer[n] != 0; ++n) {
         if (buffer[n] == '\\') {

@@ -34,7 +34,7 @@ unsigned char byteAt(const ZmUUID& u, int i)
 // non-ASCII bytes alike.
 int hexValue(char c)
 {
-    const int v = static_cast<signed char>(c);
+    const int v = static_cast<signed char>(c); // NOLINT(bugprone-signed-char-misuse): signed on purpose
     if (v < 'A') {
         return v - '0';
     }

@@ -47,7 +47,9 @@ ZmWaitCondition::ZmWaitCondition(const ZmWaitCondition& other)
 
 ZmWaitCondition& ZmWaitCondition::operator=(const ZmWaitCondition& other)
 {
-    ZmSharedPart<ZmWaitConditionPrivate>::assign(m_d, other.m_d);
+    if (this != &other) {
+        ZmSharedPart<ZmWaitConditionPrivate>::assign(m_d, other.m_d);
+    }
     return *this;
 }
 
