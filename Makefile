@@ -5,6 +5,7 @@
 #   make tsan     the same tests under ThreadSanitizer
 #   make clang    the tests built with Clang (warnings as errors, lock analysis, no global ctors)
 #   make tidy     clang-tidy over the library (any finding fails)
+#   make aarch64  cross build for 64-bit ARM (warnings as errors), portable suites under qemu-user
 #   make bench    release build, run the benchmarks, write docs/benchmarks.md
 #   make fuzz     clang build, run every fuzz target for FUZZ_SECONDS (default 60) each
 #   make install  install into PREFIX (default /usr/local)
@@ -13,7 +14,7 @@ SHELL := /bin/bash
 FUZZ_SECONDS ?= 60
 PREFIX ?= /usr/local
 
-.PHONY: all deps build demo test asan tsan clang tidy bench fuzz install format clean
+.PHONY: all deps build demo test asan tsan clang tidy aarch64 bench fuzz install format clean
 
 all: demo
 
@@ -50,6 +51,9 @@ tidy:
 	@tools/install-deps.sh clang tidy
 	cmake --preset clang
 	tools/run-clang-tidy.sh build/clang
+
+aarch64:
+	tools/ci-cross-aarch64.sh build/aarch64
 
 bench:
 	@tools/install-deps.sh bench
