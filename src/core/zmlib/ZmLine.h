@@ -64,6 +64,12 @@ public:
     /// both must lie in the box enlarged by \p tolerance on every side; on a miss both are NaN.
     /// A slab thinner along the line than \p tolerance counts as a hit at once and leaves \p enter
     /// and \p exit unwritten; this shortcut is intended.
+    ///
+    /// With \p tolerance 0 a hit can come out as a miss: the entry and exit points are computed in
+    /// float, and a line that touches the box only on a face, an edge or a corner may have them
+    /// land a rounding step outside it. For picking, pass a tolerance scaled to the coordinates,
+    /// about 1e-4f * (the largest absolute coordinate of the box and of the line's position, at
+    /// least 1); lines that graze a face almost in parallel can still miss by more.
     bool intersect(const ZmBox3f& box, ZmVec3f& enter, ZmVec3f& exit, float tolerance) const noexcept;
     /// Box picking: true when some point of the ray with parameter t > 0 lies within the margin
     /// of \p box on every axis (per axis, min - margin <= coordinate <= max + margin). The margin is

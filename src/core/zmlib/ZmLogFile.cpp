@@ -614,8 +614,11 @@ bool ZmLogFile::open(bool force)
     if (stream == nullptr) {
         return false;
     }
+    // The handle on the terminal is opened on the first open and kept, as the log always has: it
+    // still reaches the terminal after the console has been redirected into the log. The log
+    // itself never writes to it. Close-on-exec ("e"), so that started programs do not inherit it.
     if (m_d->consoleStream == nullptr) {
-        m_d->consoleStream = std::fopen("/dev/tty", "w");
+        m_d->consoleStream = std::fopen("/dev/tty", "we");
     }
     close();
     std::setvbuf(stream, nullptr, _IOFBF, kFileBufferSize);

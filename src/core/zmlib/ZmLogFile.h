@@ -29,7 +29,8 @@ struct ZmLogFilePrivate;
 
 /// The process-wide diagnostic log: one instance, reached through `getTheLogInstance()`.
 ///
-/// Lines are written as "<stamp>: <letter> [<module>] <text>" to a log file in the base folder
+/// Lines are written as "<stamp>: <letter> [<module>] <text>" (the letter of `ZmLogLevelToString`,
+/// except that information lines carry a blank where "I" would stand) to a log file in the base folder
 /// (by default the system temporary folder) once `open()` has been called, and to standard output
 /// before that or when the file cannot be opened. A file that grows beyond the size limit is
 /// continued in a new one whose first line names the old one; opening prunes the oldest log files

@@ -27,8 +27,12 @@ public:
     /// Four empty labels.
     ZmOrientationLetters();
     /// Labels of the screen-to-patient matrix \p m: each of screen x and screen y goes to the
-    /// patient axis of its largest absolute component (the lowest axis on ties), screen y never to
-    /// the axis screen x took. A matrix holding a NaN counts as the identity.
+    /// patient axis of its largest absolute component (the lowest axis on ties, with the positive
+    /// letter for a zero component); screen y competes only on the axes screen x did not take.
+    /// A degenerate matrix still gets labels: when screen y has nothing off screen x's axis (a zero
+    /// row, or both rows along one axis) its remaining components are all zero and the tie rule
+    /// gives it the x axis, which may be the one screen x took; the zero matrix gives "L/R/R/L",
+    /// which is not `isValid()`. A matrix holding a NaN counts as the identity.
     explicit ZmOrientationLetters(const ZmMat4f& m);
     /// Labels of the chain `a * b * c` (\p a applied first, then \p b, then \p c), for a view
     /// whose screen-to-patient mapping is kept in parts, e.g. screen-to-world, world-to-volume and

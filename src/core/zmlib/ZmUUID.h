@@ -18,7 +18,9 @@
 /// to the same value.
 ///
 /// A plain value: copy it freely between threads; `generateUUID()` may be called from any thread.
-/// Nothing throws or reports: malformed text gives the nil UUID.
+/// Nothing throws or reports. Text of the wrong length or shape reads as the nil UUID; characters
+/// are not checked beyond that, so 32 characters that are not all hexadecimal read as some UUID
+/// (see `fromString()`), not as nil.
 class ZMLIB_API ZmUUID : public Zm128 {
 public:
     /// The nil UUID.

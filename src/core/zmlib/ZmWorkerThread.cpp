@@ -267,8 +267,11 @@ void ZmWorkerThread::terminate()
         d->stateChanged.wait(&d->stateMutex);
     }
     d->stateMutex.unlock();
-    // The loop has ended; its thread is only returning now, so a short spin beats a sleep.
+    // The loop has ended; its thread is only returning now. Wait for that without a sleep (it is
+    // a matter of microseconds) but yielding the processor, so that the returning thread gets it
+    // even on a single core and the wait burns nothing.
     while (d->running()) {
+        ZmThread::yield();
     }
 }
 
