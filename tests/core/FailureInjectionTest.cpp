@@ -2,12 +2,15 @@
 // point: every object must come out as its contract says, and ASan/LSan watch for leaks and
 // double destruction.
 #include "FailureInjection.h"
+#include "ScratchDir.h"
 
 #include <zmlib/ZmBitfield.h>
 #include <zmlib/ZmDArray.h>
 #include <zmlib/ZmException.h>
+#include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmMemory.h>
 #include <zmlib/ZmMemoryException.h>
+#include <zmlib/ZmResult.h>
 #include <zmlib/ZmString.h>
 #include <zmlib/ZmStringTokenizer.h>
 #include <zmlib/ZmStringTokenizerGeneral.h>
@@ -16,6 +19,7 @@
 
 #include <cstdint>
 #include <cstring>
+#include <filesystem>
 #include <string>
 #include <utility>
 #include <vector>
@@ -246,4 +250,77 @@ TEST(FailureInjection, TokenizersAndBitFieldsThrowCleanly)
             bits = reference;
         });
     EXPECT_TRUE(bits == reference);
+}
+
+namespace {
+// Built before the failure walks: a line argument made by the caller is the caller's allocation.
+const ZmString& prebuiltLine()
+{
+    static const ZmString line(std::string(300, 'y').c_str());
+    return line;
+}
+} // namespace
+
+// The log never throws: at every failure point each writing operation completes or drops its
+// line (and the log keeps working afterwards); results pass the failure on as the exception of a
+// failed allocation and leave the thread's last error intact.
+TEST(FailureInjection, LogNeverThrowsAndResultsFailCleanly)
+{
+    ScratchDir dir;
+    ZmLogFile& log = getTheLogInstance();
+    const std::string oldFolder = log.baseFolder();
+    const int64_t oldCount = log.maxNumLogFiles();
+    log.setBaseFolder(dir.path());
+    log.setMaxNumLogFiles(3); // every open of the walk makes a file: keep the folder small
+    ASSERT_TRUE(log.open(true));
+    const std::string longText(300, 'x');
+    (void)prebuiltLine();
+    using Write = void (*)(ZmLogFile&, const char*);
+    const std::pair<const char*, Write> writes[] = {
+        {"trace", [](ZmLogFile& l, const char* t) { l.trace(ZmLogWarning, "module", t); }},
+        {"tracef", [](ZmLogFile& l, const char* t) { l.tracef(ZmLogError, nullptr, "%s %d", t, 7); }},
+        {"errorf", [](ZmLogFile& l, const char* t) { l.errorf("%s", t); }},
+        {"warn", [](ZmLogFile& l, const char* t) { l.warn("module", t); }},
+        {"printf", [](ZmLogFile& l, const char* t) { l.printf("%s", t); }},
+        {"print", [](ZmLogFile& l, const char* t) { l.print("module", t); }},
+        {"writeLine", [](ZmLogFile& l, const char*) { l.writeLine(ZmLogWarning, prebuiltLine()); }},
+        {"setDefaultModule", [](ZmLogFile& l, const char* t) { l.setDefaultModule(t); }},
+        {"open", [](ZmLogFile& l, const char*) { (void)l.open(true); }},
+    };
+    for (const auto& [name, write] : writes) {
+        SCOPED_TRACE(name);
+        const FailureWalk walk = walkAllocationFailures(
+            [&, write = write] {
+                // Every run starts from the same folder: an open whose clean-up ran out of memory
+                // leaves its new file and the old ones, and more files mean more failure points.
+                for (const auto& e : std::filesystem::directory_iterator(dir.path())) {
+                    std::filesystem::remove(e.path());
+                }
+                write(log, longText.c_str());
+            },
+            [](int64_t, bool threw) { EXPECT_FALSE(threw); });
+        EXPECT_EQ(walk.thrown, 0);
+    }
+    log.warn("module", "after the walks");
+    log.flush();
+    EXPECT_TRUE(log.isOpen());
+    log.close();
+    log.setBaseFolder(oldFolder);
+    log.setMaxNumLogFiles(oldCount);
+
+    const ZmResult kept(ZmResult::InvalidArgument, "kept", nullptr);
+    Kv::setError(kept);
+    const FailureWalk results = walkAllocationFailures(
+        [] {
+            ZmResult r(ZmResult::OutOfRange, 12, "file.cpp", "a text", "some data");
+            (void)Kv::fail(r);
+            ZmResult copy = r;
+            copy << ZmResult(ZmResult::NotSupported, "second", nullptr);
+        },
+        [&](int64_t, bool) {
+            const ZmResult last = Kv::lastError(true);
+            EXPECT_TRUE(last.codeValue() == ZmResult::InvalidArgument ||
+                        last.codeValue() == ZmResult::OutOfRange);
+        });
+    EXPECT_GT(results.thrown, 0);
 }

@@ -50,6 +50,21 @@ void appendText(ZmString& s, const char* text)
 
 } // namespace
 
+namespace {
+
+// The log never throws: a line that cannot get the memory it needs is dropped, and a file that
+// cannot be opened for want of memory is not opened.
+template <class F>
+void dropOnMemoryFailure(F&& f) noexcept
+{
+    try {
+        f();
+    } catch (const ZmMemoryException&) {
+    }
+}
+
+} // namespace
+
 struct ZmLogFilePrivate {
     mutable ZmMutex mutex{true};
     std::string baseFolder;
@@ -287,7 +302,7 @@ void writeLineLocked(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, cons
 void ZmLogFile::writeLine(ZmLogLevel level, const ZmString& line)
 {
     ZmMutexLocker lock(m_d->mutex);
-    writeLineLocked(*this, *m_d, level, line);
+    dropOnMemoryFailure([&] { writeLineLocked(*this, *m_d, level, line); });
 }
 
 namespace {
@@ -423,7 +438,7 @@ void ZmLogFile::trace(ZmLogLevel level, const char* module, const char* message)
 {
     if (!m_d->drops(level)) {
         message = message != nullptr ? message : "";
-        traceText(*this, *m_d, level, module, message, std::strlen(message));
+        dropOnMemoryFailure([&] { traceText(*this, *m_d, level, module, message, std::strlen(message)); });
     }
 }
 
@@ -433,8 +448,10 @@ void vtrace(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const char* m
             va_list args)
 {
     if (!d.drops(level)) {
-        const Formatted message(format, args);
-        traceText(log, d, level, module, message.text(), message.length());
+        dropOnMemoryFailure([&] {
+            const Formatted message(format, args);
+            traceText(log, d, level, module, message.text(), message.length());
+        });
     }
 }
 
@@ -469,12 +486,14 @@ void ZmLogFile::print(const char* module, const char* message)
     if (m_d->drops(ZmLogInfo)) {
         return;
     }
-    ZmString prefix;
-    if (module != nullptr && module[0] != 0) {
-        prefix.printf("[%s] ", module);
-    }
     message = message != nullptr ? message : "";
-    printText(*this, *m_d, prefix.getString(), message, std::strlen(message));
+    dropOnMemoryFailure([&] {
+        ZmString prefix;
+        if (module != nullptr && module[0] != 0) {
+            prefix.printf("[%s] ", module);
+        }
+        printText(*this, *m_d, prefix.getString(), message, std::strlen(message));
+    });
 }
 
 void ZmLogFile::printf(const char* format, ...)
@@ -484,9 +503,11 @@ void ZmLogFile::printf(const char* format, ...)
     }
     va_list args;
     va_start(args, format);
-    const Formatted message(format, args);
+    dropOnMemoryFailure([&] {
+        const Formatted message(format, args);
+        printText(*this, *m_d, "", message.text(), message.length());
+    });
     va_end(args);
-    printText(*this, *m_d, "", message.text(), message.length());
 }
 
 void ZmLogFile::writeCharBuffer(const char* text)
@@ -586,10 +607,22 @@ void cleanUpLocked(ZmLogFilePrivate& d, const ZmString* keep)
 void ZmLogFile::cleanUp()
 {
     ZmMutexLocker lock(m_d->mutex);
-    cleanUpLocked(*m_d, nullptr);
+    dropOnMemoryFailure([&] { cleanUpLocked(*m_d, nullptr); });
 }
 
 bool ZmLogFile::open(bool force)
+{
+    ZmMutexLocker lock(m_d->mutex);
+    try {
+        return openUnguarded(force);
+    } catch (const ZmMemoryException&) {
+        // Out of memory part of the way (the clean-up runs after the new file is in place):
+        // whether a stream is open now is the answer, as on every other path.
+        return m_d->stream != nullptr;
+    }
+}
+
+bool ZmLogFile::openUnguarded(bool force)
 {
     ZmMutexLocker lock(m_d->mutex);
     if (!force && m_d->stream != nullptr) {

@@ -151,6 +151,8 @@ private:
     ZmLogFile();
     ~ZmLogFile();
     static ZmLogFile* createInstance();
+    /// `open()` without its guard against running out of memory.
+    bool openUnguarded(bool force);
 
     ZmLogFilePrivate* m_d;
 };
