@@ -24,8 +24,9 @@ ZMBENCH_TARGET("ZmMat4f_product", 1.2, "4096 matrix products A[i] * B");
 // Composition and the affine inverse keep their double-precision steps; their peers take the same
 // steps in double, and Eigen's all-float figures are reported beside them (peer-float).
 ZMBENCH_TARGET("ZmMat4f_inverse", 1.2,
-               "inverse of 4096 affine 4x4 matrices (peer: Eigen inverts the 3x3 block in double and "
-               "forms the translation in float, as ours; peer-float: Matrix4f::inverse)");
+               "inverse of 4096 affine 4x4 matrices (peer: Eigen types taking our double-precision "
+               "steps; peer-eigen3d: Eigen's 3x3 inverse in double; peer-float, peer-affine3f: Eigen all "
+               "in float)");
 ZMBENCH_TARGET("ZmRotation_compose", 1.2,
                "4096 quaternion products, each normalised (peer: Eigen's product normalised with our "
                "double-precision steps; peer-float: `normalized()`, all in float)");
@@ -289,11 +290,77 @@ void InversePeer(benchmark::State& state)
 }
 BENCHMARK(InversePeer)->Name("ZmMat4f_inverse/peer-float");
 
-// The same inverse with double-precision steps: the 3x3 block inverted in double (determinant and
-// adjugate), rounded to float, and the translation row -(t * upper inverse) in float. Ours forms
-// the products in float before taking their differences in double, and also tests for
-// singularity, so the outputs agree to a float rounding, not bit for bit.
+// The affine inverse with Eigen's types taking our double-precision steps: each determinant term
+// and each cofactor product formed in float, the determinant summed in double with positive and
+// negative terms apart (and the same singularity test), the cofactor differences and the scaling
+// by 1/det in double, the translation in float. Eigen sums in its own order, so the outputs agree
+// with ours to a float rounding (checked after the timed loop), not bit for bit.
+Eigen::Vector3d crossInDouble(const Eigen::Vector3f& u, const Eigen::Vector3f& v)
+{
+    const Eigen::Array3f p(u.y() * v.z(), u.z() * v.x(), u.x() * v.y());
+    const Eigen::Array3f q(u.z() * v.y(), u.x() * v.z(), u.y() * v.x());
+    return (p.cast<double>() - q.cast<double>()).matrix();
+}
+
+void affineInverseInDouble(const Eigen::Matrix4f& m, Eigen::Matrix4f& out)
+{
+    if (m(3, 0) != 0.0f || m(3, 1) != 0.0f || m(3, 2) != 0.0f || m(3, 3) != 1.0f) {
+        out = m.inverse();
+        return;
+    }
+    // In column form the columns of the 3x3 block are our rows, and the rows of its inverse the
+    // cross products of those columns.
+    const Eigen::Vector3f a = m.block<3, 1>(0, 0), b = m.block<3, 1>(0, 1), c = m.block<3, 1>(0, 2);
+    const Eigen::Array3d p =
+        (a.array() * Eigen::Array3f(b.y(), b.z(), b.x()) * Eigen::Array3f(c.z(), c.x(), c.y()))
+            .cast<double>();
+    const Eigen::Array3d n =
+        (Eigen::Array3f(a.z(), a.x(), a.y()) * Eigen::Array3f(b.y(), b.z(), b.x()) * c.array())
+            .cast<double>();
+    const double pos = p.max(0.0).sum() - n.min(0.0).sum();
+    const double neg = p.min(0.0).sum() - n.max(0.0).sum();
+    const double det = pos + neg;
+    if (det == 0.0 || std::fabs(det / (pos - neg)) < 1e-15) {
+        out = m.inverse();
+        return;
+    }
+    const double inv = 1.0 / det;
+    out.row(0).head<3>() = (crossInDouble(b, c) * inv).cast<float>().transpose();
+    out.row(1).head<3>() = (crossInDouble(c, a) * inv).cast<float>().transpose();
+    out.row(2).head<3>() = (crossInDouble(a, b) * inv).cast<float>().transpose();
+    out.block<3, 1>(0, 3) = -(out.topLeftCorner<3, 3>() * m.block<3, 1>(0, 3));
+    out.row(3) = Eigen::RowVector4f(0.0f, 0.0f, 0.0f, 1.0f);
+}
+
 void InversePeerDouble(benchmark::State& state)
+{
+    const std::vector<ZmMat4f> ours = randomAffine(kCount, 3);
+    std::vector<Eigen::Matrix4f> in;
+    for (const ZmMat4f& m : ours)
+        in.push_back(toEigenColumnForm(m));
+    std::vector<Eigen::Matrix4f> out(in.size(), Eigen::Matrix4f::Identity());
+    for (auto _ : state) {
+        for (int i = 0; i < kCount; ++i)
+            affineInverseInDouble(in[size_t(i)], out[size_t(i)]);
+        benchmark::DoNotOptimize(out.data());
+        benchmark::ClobberMemory();
+    }
+    // The same results as ours, to a float rounding of each element's size.
+    for (size_t i = 0; i < in.size(); ++i) {
+        const Eigen::Matrix4f expected = toEigenColumnForm(ours[i].inverse());
+        const float tolerance = 4e-7f * (1.0f + expected.cwiseAbs().maxCoeff());
+        if ((out[i] - expected).cwiseAbs().maxCoeff() > tolerance) {
+            state.SkipWithError("the peer's inverse differs from ours beyond float rounding");
+            return;
+        }
+    }
+    report(state, out, "Eigen Matrix4f, our double-precision steps");
+}
+BENCHMARK(InversePeerDouble)->Name("ZmMat4f_inverse/peer");
+
+// Reported beside it: Eigen's own inverse of the 3x3 block in double (products in double too, no
+// singularity test), rounded to float, with the translation row in float.
+void InversePeerEigenDouble(benchmark::State& state)
 {
     std::vector<Eigen::Affine3f> in;
     for (const ZmMat4f& m : randomAffine(kCount, 3))
@@ -311,7 +378,7 @@ void InversePeerDouble(benchmark::State& state)
     }
     report(state, out, "Eigen 3x3 block inverted in double, translation in float");
 }
-BENCHMARK(InversePeerDouble)->Name("ZmMat4f_inverse/peer");
+BENCHMARK(InversePeerEigenDouble)->Name("ZmMat4f_inverse/peer-eigen3d");
 
 void InversePeerAffine(benchmark::State& state)
 {
