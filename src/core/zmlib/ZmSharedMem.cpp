@@ -146,15 +146,17 @@ void reclaimOrphans()
         if (std::strncmp(e->d_name, kPrefix, prefixLength) != 0) {
             continue;
         }
-        ZmString object("/");
-        object += e->d_name;
-        const int fd = shm_open(object.getString(), O_RDWR | O_NOFOLLOW, 0);
+        // On the stack: nothing here may throw while the directory is open.
+        char object[sizeof e->d_name + 1];
+        object[0] = '/';
+        std::memcpy(object + 1, e->d_name, std::strlen(e->d_name) + 1);
+        const int fd = shm_open(object, O_RDWR | O_NOFOLLOW, 0);
         if (fd < 0) {
             continue; // gone already, or another user's
         }
         struct stat st;
         if (lockFile(fd, LOCK_EX | LOCK_NB) == 0 && fstat(fd, &st) == 0 && st.st_nlink > 0) {
-            shm_unlink(object.getString());
+            shm_unlink(object);
         }
         close(fd);
     }
