@@ -58,6 +58,11 @@ int readEntries(const char* dir, const char* pattern, bool directoriesOnly, ZmDA
     if (d == nullptr) {
         return -1;
     }
+    // Closed on every way out: a listing that runs out of memory throws from the loop below.
+    struct Closer {
+        DIR* dir;
+        ~Closer() { ::closedir(dir); }
+    } closer{d};
     const int fd = ::dirfd(d);
     while (const struct dirent* de = ::readdir(d)) {
         const char* name = de->d_name;
@@ -72,7 +77,6 @@ int readEntries(const char* dir, const char* pattern, bool directoriesOnly, ZmDA
         e.info.name = name;
         out.append(e);
     }
-    ::closedir(d);
     return int(out.size());
 }
 
