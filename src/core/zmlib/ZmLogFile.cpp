@@ -1,10 +1,12 @@
 #include <zmlib/ZmDirectory.h>
 #include <zmlib/ZmFilename.h>
 #include <zmlib/ZmLogFile.h>
+#include <zmlib/ZmLogFile_p.h>
 #include <zmlib/ZmMemory.h>
 #include <zmlib/ZmMemoryException.h>
 #include <zmlib/ZmMutex.h>
 #include <zmlib/ZmTmpDir.h>
+#include <zmlib/ZmWallClock_p.h>
 
 #include <atomic>
 #include <cctype>
@@ -14,7 +16,6 @@
 #include <cstring>
 #include <ctime>
 #include <memory>
-#include <unistd.h>
 
 namespace {
 
@@ -91,7 +92,7 @@ struct ZmLogFilePrivate {
     int relativeMilliseconds = 0;
 
     // The stamp of the last second stamped, up to its '.'.
-    time_t cachedSecond = -1;
+    int64_t cachedSecond = -1;
     ZmLogFile::DateTimeFormat cachedFormat = ZmLogFile::NoDateTime;
     char cachedPrefix[kMaxStamp];
     size_t cachedPrefixLength = 0;
@@ -109,7 +110,7 @@ struct ZmLogFilePrivate {
     void writeLocked(ZmLogLevel level, const ZmString& text);
     /// Writes the stamp (no terminator) to \p out, which has room for kMaxStamp bytes; returns
     /// its length.
-    size_t stampLocked(char* out, ZmLogFile::DateTimeFormat format, const timespec& now);
+    size_t stampLocked(char* out, ZmLogFile::DateTimeFormat format, const ZmWallTime& now);
 };
 
 // --- levels ------------------------------------------------------------------------------------
@@ -206,14 +207,14 @@ ZmLogFile& getTheLogInstance()
 
 // --- writing -----------------------------------------------------------------------------------
 
-size_t ZmLogFilePrivate::stampLocked(char* out, ZmLogFile::DateTimeFormat format, const timespec& now)
+size_t ZmLogFilePrivate::stampLocked(char* out, ZmLogFile::DateTimeFormat format, const ZmWallTime& now)
 {
     if (format != ZmLogFile::TimeOfDay && format != ZmLogFile::DateAndTime) {
         return 0;
     }
-    int ms = int(now.tv_nsec / 1000000);
+    int ms = int(now.nanoseconds / 1000000);
     if (format == ZmLogFile::TimeOfDay && relativeTime) {
-        int64_t seconds = int64_t(now.tv_sec) - relativeSeconds;
+        int64_t seconds = now.seconds - relativeSeconds;
         ms -= relativeMilliseconds;
         if (ms < 0) {
             ms += 1000;
@@ -222,10 +223,9 @@ size_t ZmLogFilePrivate::stampLocked(char* out, ZmLogFile::DateTimeFormat format
         return size_t(std::snprintf(out, kMaxStamp, "%02d:%02d:%02d.%03d", int(seconds / 3600 % 24),
                                     int(seconds / 60 % 60), int(seconds % 60), ms));
     }
-    if (now.tv_sec != cachedSecond || format != cachedFormat) {
+    if (now.seconds != cachedSecond || format != cachedFormat) {
         // The stamp up to the seconds changes once a second: format it then, not on every line.
-        struct tm t;
-        localtime_r(&now.tv_sec, &t);
+        const std::tm t = zmLocalTime(now.seconds);
         if (format == ZmLogFile::TimeOfDay) {
             cachedPrefixLength = size_t(std::snprintf(cachedPrefix, sizeof cachedPrefix, "%02d:%02d:%02d.",
                                                       t.tm_hour, t.tm_min, t.tm_sec));
@@ -234,7 +234,7 @@ size_t ZmLogFilePrivate::stampLocked(char* out, ZmLogFile::DateTimeFormat format
                 std::snprintf(cachedPrefix, sizeof cachedPrefix, "%04d-%02d-%02d %02d:%02d:%02d.",
                               t.tm_year + 1900, t.tm_mon + 1, t.tm_mday, t.tm_hour, t.tm_min, t.tm_sec));
         }
-        cachedSecond = now.tv_sec;
+        cachedSecond = now.seconds;
         cachedFormat = format;
     }
     std::memcpy(out, cachedPrefix, cachedPrefixLength);
@@ -332,7 +332,8 @@ private:
 
 // Builds "<stamp>: <letter> [<module>] " into line; the message follows. One capacity check and
 // plain stores: this runs for every line.
-void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char* module, const timespec& now)
+void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char* module,
+               const ZmWallTime& now)
 {
     const char* name = module != nullptr && module[0] != 0 ? module : d.defaultModule;
     const size_t nameLength = std::strlen(name);
@@ -404,8 +405,7 @@ void traceText(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const char
     // The clock is read before the lock, as the message was formatted: the lock is held only to
     // build and write the line. Lines of different threads may then differ from their stamps'
     // order by the time a thread waits for the lock.
-    timespec now;
-    clock_gettime(CLOCK_REALTIME, &now);
+    const ZmWallTime now = zmWallClock();
     ZmMutexLocker lock(d.mutex);
     LineBuffer buffer(d);
     beginLine(d, buffer.line(), level, module, now);
@@ -649,9 +649,9 @@ bool ZmLogFile::openUnguarded(bool force)
     }
     // The handle on the terminal is opened on the first open and kept, as the log always has: it
     // still reaches the terminal after the console has been redirected into the log. The log
-    // itself never writes to it. Close-on-exec ("e"), so that started programs do not inherit it.
+    // itself never writes to it. Started programs do not inherit it.
     if (m_d->consoleStream == nullptr) {
-        m_d->consoleStream = std::fopen("/dev/tty", "we");
+        m_d->consoleStream = zmLogOpenConsole();
     }
     close();
     std::setvbuf(stream, nullptr, _IOFBF, kFileBufferSize);
@@ -662,7 +662,7 @@ bool ZmLogFile::openUnguarded(bool force)
         std::fflush(stdout);
         std::fflush(stderr);
         if (std::freopen(path.getString(), "a", stdout) != nullptr) {
-            dup2(fileno(stdout), STDERR_FILENO);
+            zmLogRedirectStandardError();
         }
     }
     m_d->filePath = path;
@@ -799,20 +799,18 @@ bool ZmLogFile::debugEnabled() const
 
 void ZmLogFile::resetTimeStamp()
 {
-    struct timespec now;
-    clock_gettime(CLOCK_REALTIME, &now);
+    const ZmWallTime now = zmWallClock();
     ZmMutexLocker lock(m_d->mutex);
     m_d->relativeTime = true;
-    m_d->relativeSeconds = now.tv_sec;
-    m_d->relativeMilliseconds = int(now.tv_nsec / 1000000);
+    m_d->relativeSeconds = now.seconds;
+    m_d->relativeMilliseconds = int(now.nanoseconds / 1000000);
 }
 
 void ZmLogFile::timeString(ZmString& out, DateTimeFormat format) const
 {
     char stamp[kMaxStamp];
     ZmMutexLocker lock(m_d->mutex);
-    timespec now;
-    clock_gettime(CLOCK_REALTIME, &now);
+    const ZmWallTime now = zmWallClock();
     out = ZmString(stamp, 0, int(m_d->stampLocked(stamp, format, now)));
 }
 

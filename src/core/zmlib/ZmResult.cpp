@@ -1,5 +1,6 @@
 #include <zmlib/ZmLogFile.h>
 #include <zmlib/ZmResult.h>
+#include <zmlib/ZmResult_p.h>
 #include <zmlib/ZmThreadLocalStorageBase.h>
 
 #include <cerrno>
@@ -138,7 +139,7 @@ ZmThreadLocalStorageBase& lastErrorSlot()
 std::string systemText(int error)
 {
     char buffer[256];
-    std::string text = strerror_r(error, buffer, sizeof buffer);
+    std::string text = zmSystemErrorText(error, buffer, sizeof buffer);
     for (char& c : text) {
         if (c == '\r' || c == '\n') {
             c = ' ';

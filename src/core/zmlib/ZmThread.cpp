@@ -1,15 +1,8 @@
 #include <zmlib/ZmLogFile.h>
-#include <zmlib/ZmMutex.h>
-#include <zmlib/ZmSharedCount_p.h>
 #include <zmlib/ZmThread.h>
-#include <zmlib/ZmWaitCondition.h>
+#include <zmlib/ZmThread_p.h>
 
 #include <atomic>
-#include <cerrno>
-#include <pthread.h>
-#include <sched.h>
-#include <time.h>
-#include <unistd.h>
 
 namespace {
 
@@ -21,48 +14,21 @@ std::atomic<int> s_threadCounter{0};
 
 std::atomic<unsigned long> s_mainThreadId{0};
 
-void sleepMs(unsigned long ms)
-{
-    if (ms == 0) {
-        sched_yield();
-        return;
-    }
-    timespec t;
-    t.tv_sec = static_cast<time_t>(ms / 1000);
-    t.tv_nsec = static_cast<long>(ms % 1000) * 1000000;
-    while (nanosleep(&t, &t) != 0 && errno == EINTR) {
-    }
-}
-
 } // namespace
 
-struct ZmThreadPrivate {
-    pthread_attr_t attr;
-    pthread_t handle{};
-    // Written under the state mutex; read without it by running()/finished().
-    std::atomic<int> state{NeverStarted};
-    ZmMutex stateMutex;
-    ZmWaitCondition finished;
-    ZmString name;
-    // The copy whose start() launched the current run.
-    ZmThread* runner = nullptr;
-    // Every ZmThread sharing this part holds one reference, and so does a run that is going.
-    ZmSharedCount refs;
-
-    static void destroy(ZmThreadPrivate* d)
-    {
-        const int rc = pthread_attr_destroy(&d->attr);
-        if (rc != 0) {
-            getTheLogInstance().errorf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
-        }
-        delete d;
+void ZmThreadPrivate::destroy(ZmThreadPrivate* d)
+{
+    const int rc = zmThreadAttributesDestroy(d->attributes);
+    if (rc != 0) {
+        getTheLogInstance().errorf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
     }
-};
+    delete d;
+}
 
 ZmThread::ZmThread() : m_d(new ZmThreadPrivate)
 {
     m_d->name = ZmString(0, "ZmThread %d", s_threadCounter.fetch_add(1, std::memory_order_relaxed));
-    const int rc = pthread_attr_init(&m_d->attr);
+    const int rc = zmThreadAttributesInit(m_d->attributes);
     if (rc != 0) {
         getTheLogInstance().errorf("ZmThread::ZmThread() failed (error code: %d)\n", rc);
     }
@@ -72,7 +38,7 @@ ZmThread::ZmThread(const char* name) : m_d(new ZmThreadPrivate)
 {
     const int n = s_threadCounter.fetch_add(1, std::memory_order_relaxed);
     m_d->name = name != nullptr ? ZmString(name) : ZmString(0, "ZmThread %d", n);
-    const int rc = pthread_attr_init(&m_d->attr);
+    const int rc = zmThreadAttributesInit(m_d->attributes);
     if (rc != 0) {
         getTheLogInstance().errorf("ZmThread::ZmThread(const char*) failed (error code: %d)\n", rc);
     }
@@ -116,7 +82,7 @@ void ZmThread::start()
     }
     m_d->runner = this;
     m_d->refs.ref();
-    const int rc = pthread_create(&m_d->handle, &m_d->attr, &ZmThread::trampoline, m_d);
+    const int rc = zmThreadLaunch(m_d->attributes, &ZmThread::trampoline, m_d);
     if (rc != 0) {
         // The destructor's text is reused for this warning on purpose; log readers match on it.
         getTheLogInstance().warnf("ZmThread::~ZmThread() failed (error code: %d)\n", rc);
@@ -124,7 +90,6 @@ void ZmThread::start()
         m_d->stateMutex.unlock();
         return;
     }
-    pthread_detach(m_d->handle);
     m_d->state.store(Running, std::memory_order_release);
     m_d->stateMutex.unlock();
 }
@@ -164,37 +129,27 @@ void ZmThread::setThreadName(const char* name)
 
 void ZmThread::sleep(unsigned long seconds)
 {
-    sleepMs(seconds * 1000);
+    zmThreadSleep(seconds * 1000);
 }
 
 void ZmThread::msleep(unsigned long ms)
 {
-    sleepMs(ms);
+    zmThreadSleep(ms);
 }
 
 // One millisecond more than the whole milliseconds, so that no sleep is zero; intended.
 void ZmThread::usleep(unsigned long us)
 {
-    sleepMs(us / 1000 + 1);
+    zmThreadSleep(us / 1000 + 1);
 }
 
 void ZmThread::yield()
 {
-    sleepMs(0);
+    zmThreadSleep(0);
 }
 
 void ZmThread::setThreadNameNative(const char*)
 {}
-
-unsigned long kvCurrentProcessId()
-{
-    return static_cast<unsigned long>(getpid());
-}
-
-unsigned long kvCurrentThreadId()
-{
-    return static_cast<unsigned long>(gettid());
-}
 
 unsigned long kvMainThreadId()
 {

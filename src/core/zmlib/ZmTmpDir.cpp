@@ -1,19 +1,18 @@
 #include <zmlib/ZmTmpDir.h>
 
 #include <zmlib/ZmDirectory.h>
+#include <zmlib/ZmFileSystem_p.h>
 #include <zmlib/ZmFilename.h>
 #include <zmlib/ZmLogFile.h>
 
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace {
 
-/// \p path without one trailing '/' (the root "/" stays): lstat would otherwise follow a final
-/// symbolic link.
+/// \p path without one trailing '/' (the root "/" stays): the system would otherwise follow a
+/// final symbolic link.
 ZmString withoutTrailingSlash(const ZmString& path)
 {
     ZmString s(path);
@@ -25,8 +24,7 @@ ZmString withoutTrailingSlash(const ZmString& path)
 
 bool isRealDirectory(const char* path)
 {
-    struct stat st;
-    return ::lstat(path, &st) == 0 && S_ISDIR(st.st_mode);
+    return zmfs::isDirectory(path, false);
 }
 
 void logDeleteFailure(const char* path)
@@ -34,7 +32,7 @@ void logDeleteFailure(const char* path)
     getTheLogInstance().errorf("Can't delete %s:\n%s\n", path, std::strerror(errno));
 }
 
-/// Depth-first removal. Entries are classified with lstat, so a symbolic link to a directory is
+/// Depth-first removal. Entries are classified without following links, so a symbolic link to a directory is
 /// unlinked like a file and nothing outside the tree is reached through it.
 int removeTree(const ZmString& dir)
 {
@@ -47,11 +45,11 @@ int removeTree(const ZmString& dir)
         const ZmString path(0, "%s/%s", dir.getString(), name.getString());
         if (isRealDirectory(path.getString())) {
             removeTree(path);
-        } else if (::unlink(path.getString()) != 0) {
+        } else if (!zmfs::removeFile(path.getString())) {
             logDeleteFailure(path.getString());
         }
     }
-    if (::rmdir(dir.getString()) != 0) {
+    if (!zmfs::removeDirectory(dir.getString())) {
         logDeleteFailure(dir.getString());
         return -1;
     }
@@ -88,13 +86,12 @@ void ZmTmpDir::makeUnique(const char* name)
     }
     const char* component = s + slash + 1;
     result += component[0] != 0 ? component : "tmp";
-    struct stat st;
-    if (::lstat(result.getString(), &st) == 0) {
+    if (zmfs::nameExists(result.getString())) {
         // Intended: the second directory of a name is ".2" (the first is the bare name), unlike
         // ZmFilename::makeUnique(), which counts from 1; directory names already made keep their form.
         for (int n = 2;; ++n) {
             const ZmString candidate(0, "%s.%d", result.getString(), n);
-            if (::lstat(candidate.getString(), &st) != 0) {
+            if (!zmfs::nameExists(candidate.getString())) {
                 result = candidate;
                 break;
             }
@@ -106,7 +103,7 @@ void ZmTmpDir::makeUnique(const char* name)
 
 int ZmTmpDir::create(int mode)
 {
-    return ::mkdir(withoutTrailingSlash(*this).getString(), mode_t(mode)) == 0 ? 1 : 0;
+    return zmfs::makeDirectory(withoutTrailingSlash(*this).getString(), mode) ? 1 : 0;
 }
 
 bool ZmTmpDir::doesExist() const
