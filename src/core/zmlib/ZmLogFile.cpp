@@ -68,49 +68,49 @@ void dropOnMemoryFailure(F&& f) noexcept
 
 struct ZmLogFilePrivate {
     mutable ZmMutex mutex{true};
-    std::string baseFolder;
-    bool dateFoldersEnabled = false;
-    FILE* stream = nullptr;
-    FILE* consoleStream = nullptr;
-    ZmFilename filePath;
-    int64_t maxNumLogFiles = 40;
-    uint64_t maxLogFileSizeInBytes = 50000000;
-    ZmLogFile::WriteCallback writeCallback = nullptr;
+    std::string baseFolder ZM_GUARDED_BY(mutex);
+    bool dateFoldersEnabled ZM_GUARDED_BY(mutex) = false;
+    FILE* stream ZM_GUARDED_BY(mutex) = nullptr;
+    FILE* consoleStream ZM_GUARDED_BY(mutex) = nullptr;
+    ZmFilename filePath ZM_GUARDED_BY(mutex);
+    int64_t maxNumLogFiles ZM_GUARDED_BY(mutex) = 40;
+    uint64_t maxLogFileSizeInBytes ZM_GUARDED_BY(mutex) = 50000000;
+    ZmLogFile::WriteCallback writeCallback ZM_GUARDED_BY(mutex) = nullptr;
     // Read without the lock to drop lines early; written under it.
     std::atomic<int> logLevel{ZmLogInfo};
-    ZmLogLevel writeCallbackLogLevel = ZmLogNone;
-    bool consoleToLogEnabled = false;
-    bool logToConsoleEnabled = false;
-    ZmLogFile::DateTimeFormat dateTimeFormat = ZmLogFile::TimeOfDay;
+    ZmLogLevel writeCallbackLogLevel ZM_GUARDED_BY(mutex) = ZmLogNone;
+    bool consoleToLogEnabled ZM_GUARDED_BY(mutex) = false;
+    bool logToConsoleEnabled ZM_GUARDED_BY(mutex) = false;
+    ZmLogFile::DateTimeFormat dateTimeFormat ZM_GUARDED_BY(mutex) = ZmLogFile::TimeOfDay;
     // Points into `modules`: an interned name stays valid for the life of the process, so the
     // text defaultModule() hands out survives any later setDefaultModule.
-    const char* defaultModule = "";
-    ZmDArray<char*> modules;
-    int64_t bytesWritten = 0;
-    bool relativeTime = false;
-    int64_t relativeSeconds = 0;
-    int relativeMilliseconds = 0;
+    const char* defaultModule ZM_GUARDED_BY(mutex) = "";
+    ZmDArray<char*> modules ZM_GUARDED_BY(mutex);
+    int64_t bytesWritten ZM_GUARDED_BY(mutex) = 0;
+    bool relativeTime ZM_GUARDED_BY(mutex) = false;
+    int64_t relativeSeconds ZM_GUARDED_BY(mutex) = 0;
+    int relativeMilliseconds ZM_GUARDED_BY(mutex) = 0;
 
     // The stamp of the last second stamped, up to its '.'.
-    int64_t cachedSecond = -1;
-    ZmLogFile::DateTimeFormat cachedFormat = ZmLogFile::NoDateTime;
-    char cachedPrefix[kMaxStamp];
-    size_t cachedPrefixLength = 0;
+    int64_t cachedSecond ZM_GUARDED_BY(mutex) = -1;
+    ZmLogFile::DateTimeFormat cachedFormat ZM_GUARDED_BY(mutex) = ZmLogFile::NoDateTime;
+    char cachedPrefix[kMaxStamp] ZM_GUARDED_BY(mutex);
+    size_t cachedPrefixLength ZM_GUARDED_BY(mutex) = 0;
     // The line being formatted; reused under the lock so that a line costs no allocation.
-    ZmString line;
-    bool lineInUse = false;
+    ZmString line ZM_GUARDED_BY(mutex);
+    bool lineInUse ZM_GUARDED_BY(mutex) = false;
 
     /// Lines below the level are dropped before any formatting (read without the lock).
     bool drops(ZmLogLevel level) const;
-    bool fullLocked() const
+    bool fullLocked() const ZM_REQUIRES(mutex)
     {
         return stream != nullptr && maxLogFileSizeInBytes != 0 &&
                uint64_t(bytesWritten) > maxLogFileSizeInBytes;
     }
-    void writeLocked(ZmLogLevel level, const ZmString& text);
+    void writeLocked(ZmLogLevel level, const ZmString& text) ZM_REQUIRES(mutex);
     /// Writes the stamp (no terminator) to \p out, which has room for kMaxStamp bytes; returns
     /// its length.
-    size_t stampLocked(char* out, ZmLogFile::DateTimeFormat format, const ZmWallTime& now);
+    size_t stampLocked(char* out, ZmLogFile::DateTimeFormat format, const ZmWallTime& now) ZM_REQUIRES(mutex);
 };
 
 // --- levels ------------------------------------------------------------------------------------
@@ -287,6 +287,7 @@ namespace {
 
 // writeLine with the lock already held (the formatting members hold it while they build the line).
 void writeLineLocked(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, const ZmString& line)
+    ZM_REQUIRES(d.mutex)
 {
     if (level < d.logLevel.load(std::memory_order_relaxed)) {
         return;
@@ -302,7 +303,8 @@ void writeLineLocked(ZmLogFile& log, ZmLogFilePrivate& d, ZmLogLevel level, cons
 void ZmLogFile::writeLine(ZmLogLevel level, const ZmString& line)
 {
     ZmMutexLocker lock(m_d->mutex);
-    dropOnMemoryFailure([&] { writeLineLocked(*this, *m_d, level, line); });
+    // The analysis does not follow the lock into a lambda; this one runs at once, inside it.
+    dropOnMemoryFailure([&]() ZM_NO_THREAD_SAFETY_ANALYSIS { writeLineLocked(*this, *m_d, level, line); });
 }
 
 namespace {
@@ -311,14 +313,15 @@ namespace {
 // a continued file, a callback that logs) gets a buffer of its own.
 class LineBuffer {
 public:
-    explicit LineBuffer(ZmLogFilePrivate& d)
+    explicit LineBuffer(ZmLogFilePrivate& d) ZM_REQUIRES(d.mutex)
         : m_d(d), m_wasInUse(d.lineInUse), m_own(m_wasInUse ? new ZmString : nullptr),
           m_line(m_wasInUse ? *m_own : d.line)
     {
         d.lineInUse = true;
         m_line.clear();
     }
-    ~LineBuffer() { m_d.lineInUse = m_wasInUse; }
+    // Runs where the constructor ran: inside the same lock.
+    ~LineBuffer() ZM_NO_THREAD_SAFETY_ANALYSIS { m_d.lineInUse = m_wasInUse; }
     LineBuffer(const LineBuffer&) = delete;
     LineBuffer& operator=(const LineBuffer&) = delete;
     ZmString& line() { return m_line; }
@@ -333,7 +336,7 @@ private:
 // Builds "<stamp>: <letter> [<module>] " into line; the message follows. One capacity check and
 // plain stores: this runs for every line.
 void beginLine(ZmLogFilePrivate& d, ZmString& line, ZmLogLevel level, const char* module,
-               const ZmWallTime& now)
+               const ZmWallTime& now) ZM_REQUIRES(d.mutex)
 {
     const char* name = module != nullptr && module[0] != 0 ? module : d.defaultModule;
     const size_t nameLength = std::strlen(name);
@@ -571,7 +574,7 @@ ZmString ZmLogFile::filePath() const
 
 namespace {
 
-void cleanUpLocked(ZmLogFilePrivate& d, const ZmString* keep)
+void cleanUpLocked(ZmLogFilePrivate& d, const ZmString* keep) ZM_REQUIRES(d.mutex)
 {
     // A negative limit (a typo in the environment, a bad setter call) means no clean-up, like 0:
     // read as a count it would make every log file of the folder "excess".
@@ -607,7 +610,8 @@ void cleanUpLocked(ZmLogFilePrivate& d, const ZmString* keep)
 void ZmLogFile::cleanUp()
 {
     ZmMutexLocker lock(m_d->mutex);
-    dropOnMemoryFailure([&] { cleanUpLocked(*m_d, nullptr); });
+    // The analysis does not follow the lock into a lambda; this one runs at once, inside it.
+    dropOnMemoryFailure([&]() ZM_NO_THREAD_SAFETY_ANALYSIS { cleanUpLocked(*m_d, nullptr); });
 }
 
 bool ZmLogFile::open(bool force)

@@ -64,7 +64,11 @@ ZmThread::~ZmThread()
 void* ZmThread::trampoline(void* arg)
 {
     auto* d = static_cast<ZmThreadPrivate*>(arg);
-    d->runner->run();
+    // Taken under the lock that start() holds while it launches this run (it may still hold it).
+    d->stateMutex.lock();
+    ZmThread* runner = d->runner;
+    d->stateMutex.unlock();
+    runner->run();
     d->stateMutex.lock();
     d->state.store(Finished, std::memory_order_release);
     d->finished.wakeAll();

@@ -24,8 +24,8 @@ public:
 
 private:
     int m_count;
-    int m_remaining;
-    int m_generation;
+    int m_remaining ZM_GUARDED_BY(m_mutex);
+    int m_generation ZM_GUARDED_BY(m_mutex);
     ZmMutex m_mutex;
     ZmWaitCondition m_condition;
 };

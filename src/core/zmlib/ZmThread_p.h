@@ -27,7 +27,7 @@ struct ZmThreadPrivate {
     ZmWaitCondition finished;
     ZmString name;
     // The copy whose start() launched the current run.
-    ZmThread* runner = nullptr;
+    ZmThread* runner ZM_GUARDED_BY(stateMutex) = nullptr;
     // Every ZmThread sharing this part holds one reference, and so does a run that is going.
     ZmSharedCount refs;
 

@@ -3,8 +3,8 @@
 #pragma once
 
 #include <zmlib/ZmExport.h>
+#include <zmlib/ZmMutex.h>
 
-class ZmMutex;
 struct ZmWaitConditionPrivate;
 
 /// A condition variable over the POSIX one, waited on with a `ZmMutex` that the caller holds.
@@ -22,7 +22,7 @@ public:
 
     /// Releases \p mutex, waits for a wake or for \p ms milliseconds of monotonic time (4294967295
     /// and more: no limit) and locks \p mutex again. True when woken, false on time-out or failure.
-    bool wait(ZmMutex* mutex, unsigned long ms = 4294967295UL);
+    bool wait(ZmMutex* mutex, unsigned long ms = 4294967295UL) ZM_REQUIRES(*mutex);
     void wakeOne();
     void wakeAll();
 

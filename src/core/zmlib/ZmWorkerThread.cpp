@@ -35,9 +35,9 @@ public:
     /// the worker), and the last one whose callers were released (under `callerMutex`). A
     /// synchronous start() waits for the release of its own job, so that neither a wake-up of an
     /// earlier job nor a spurious one lets it go, and a release that came first is not missed.
-    uint64_t startedJobs = 0;
+    uint64_t startedJobs ZM_GUARDED_BY(stateMutex) = 0;
     std::atomic<uint64_t> runningJob{0};
-    uint64_t releasedJob = 0;
+    uint64_t releasedJob ZM_GUARDED_BY(callerMutex) = 0;
 
     State load() const { return state.load(std::memory_order_relaxed); }
     // Released, so that whoever sees a new state through state() also sees the job counters.
