@@ -45,7 +45,13 @@
 #include <zmlib/ZmOrientationLetters.h>
 #include <zmlib/ZmPackedIndexing.h>
 #include <zmlib/ZmPlane.h>
+#include <zmlib/ZmPrimType.h>
 #include <zmlib/ZmProcessInfo.h>
+#include <zmlib/ZmProgressGuiInterface.h>
+#include <zmlib/ZmProgressInterface.h>
+#include <zmlib/ZmRawData.h>
+#include <zmlib/ZmRawData2D.h>
+#include <zmlib/ZmRawData3D.h>
 #include <zmlib/ZmRemotificationID.h>
 #include <zmlib/ZmResult.h>
 #include <zmlib/ZmRotation.h>
@@ -65,6 +71,7 @@
 #include <zmlib/ZmTransferID.h>
 #include <zmlib/ZmTypeInfo.h>
 #include <zmlib/ZmTypedObject.h>
+#include <zmlib/ZmTypedPointer.h>
 #include <zmlib/ZmUUID.h>
 #include <zmlib/ZmUniqueID.h>
 #include <zmlib/ZmVec2f.h>

@@ -1,0 +1,1077 @@
+#include <zmlib/ZmRawData.h>
+
+#include <zmlib/ZmBitfield.h>
+#include <zmlib/ZmLogFile.h>
+#include <zmlib/ZmMemory.h>
+#include <zmlib/ZmMemoryException.h>
+#include <zmlib/ZmProgressInterface.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstring>
+#include <limits>
+#include <type_traits>
+
+namespace {
+
+using Byte = unsigned char;
+
+// --- element types -------------------------------------------------------------------------------
+
+template <class T>
+struct Tag {
+    using type = T;
+};
+
+/// Calls f(Tag<T>()) with the element type of \p code when it is numeric (not "complex" or
+/// "string"); false otherwise. The one switch per call that keeps the loops free of dispatch.
+template <class F>
+bool withNumericType(int code, F&& f)
+{
+    switch (code) {
+    case ZmPrimType::BYTE:
+        f(Tag<uint8_t>());
+        return true;
+    case ZmPrimType::SHORT:
+        f(Tag<int16_t>());
+        return true;
+    case ZmPrimType::INT:
+        f(Tag<int32_t>());
+        return true;
+    case ZmPrimType::FLOAT:
+        f(Tag<float>());
+        return true;
+    case ZmPrimType::DOUBLE:
+        f(Tag<double>());
+        return true;
+    case ZmPrimType::USHORT:
+        f(Tag<uint16_t>());
+        return true;
+    case ZmPrimType::UINT:
+        f(Tag<uint32_t>());
+        return true;
+    case ZmPrimType::SBYTE:
+        f(Tag<int8_t>());
+        return true;
+    default:
+        return false;
+    }
+}
+
+void logUnsupported(const char* where, ZmPrimType type)
+{
+    getTheLogInstance().errorf("Unsupported data type %s in %s\n", type.getName(), where);
+}
+
+/// \p v in the destination type D: integers saturate, floating values are clamped and truncated
+/// toward zero (NaN gives 0), everything into a floating type converts as C++ converts it.
+template <class D, class S>
+inline D convertValue(S v)
+{
+    if constexpr (std::is_floating_point_v<D>) {
+        return D(v);
+    } else if constexpr (std::is_floating_point_v<S>) {
+        // The bounds as S: for int and uint from float they round up to 2^31 and 2^32, which the
+        // >= test catches before any conversion could overflow.
+        constexpr S lo = S(std::numeric_limits<D>::min());
+        constexpr S hi = S(std::numeric_limits<D>::max());
+        if (std::isnan(v)) {
+            return D(0);
+        }
+        return v <= lo ? std::numeric_limits<D>::min() : v >= hi ? std::numeric_limits<D>::max() : D(v);
+    } else {
+        // Every integer element type is at most 32 bits wide.
+        using Wide = int64_t;
+        // NOLINTNEXTLINE(bugprone-signed-char-misuse): signed bytes are values here
+        constexpr Wide lo = Wide(std::numeric_limits<D>::min());
+        constexpr Wide hi = Wide(std::numeric_limits<D>::max());
+        if constexpr (int64_t(std::numeric_limits<S>::min()) >= int64_t(std::numeric_limits<D>::min()) &&
+                      uint64_t(std::numeric_limits<S>::max()) <= uint64_t(std::numeric_limits<D>::max())) {
+            return D(v);
+        } else {
+            const Wide w = Wide(v); // NOLINT(bugprone-signed-char-misuse): signed bytes are values here
+            return D(w < lo ? lo : w > hi ? hi : w);
+        }
+    }
+}
+
+template <class D, class S>
+void convertLoop(D* __restrict d, const S* __restrict s, uint64_t n)
+{
+    for (uint64_t i = 0; i < n; ++i) {
+        d[i] = convertValue<D>(s[i]);
+    }
+}
+
+template <class D, class S>
+void mapLinearLoop(D* __restrict d, const S* __restrict s, uint64_t n, float offset, float scale)
+{
+    for (uint64_t i = 0; i < n; ++i) {
+        const float v = (float(s[i]) + offset) * scale;
+        d[i] = convertValue<D>(v);
+    }
+}
+
+// --- range -------------------------------------------------------------------------------------
+
+/// The range of p[0..n) under the sequential rule (a value lowers min when below it, else raises
+/// max when above it), in eight independent lanes so that the loop vectorises. The lanes all start
+/// at p[0]; NaN never wins a comparison, so NaN after the first value is passed over as the
+/// sequential rule passes it over.
+template <class T>
+void rangeOf(const T* p, uint64_t n, T& lo, T& hi)
+{
+    constexpr int kLanes = 8;
+    T mn[kLanes];
+    T mx[kLanes];
+    for (int k = 0; k < kLanes; ++k) {
+        mn[k] = lo;
+        mx[k] = hi;
+    }
+    uint64_t i = 0;
+    for (; i + kLanes <= n; i += kLanes) {
+        for (int k = 0; k < kLanes; ++k) {
+            const T v = p[i + uint64_t(k)];
+            mn[k] = v < mn[k] ? v : mn[k];
+            mx[k] = v > mx[k] ? v : mx[k];
+        }
+    }
+    for (; i < n; ++i) {
+        const T v = p[i];
+        mn[0] = v < mn[0] ? v : mn[0];
+        mx[0] = v > mx[0] ? v : mx[0];
+    }
+    for (int k = 0; k < kLanes; ++k) {
+        lo = mn[k] < lo ? mn[k] : lo;
+        hi = mx[k] > hi ? mx[k] : hi;
+    }
+}
+
+/// Calls f(Tag<T>(), count factor) for the types that getRange and isConstant cover; complex is
+/// read as floats, two per element.
+template <class F>
+bool withRangeType(int code, F&& f)
+{
+    switch (code) {
+    case ZmPrimType::BYTE:
+        f(Tag<uint8_t>(), 1);
+        return true;
+    case ZmPrimType::SHORT:
+        f(Tag<int16_t>(), 1);
+        return true;
+    case ZmPrimType::INT:
+        f(Tag<int32_t>(), 1);
+        return true;
+    case ZmPrimType::FLOAT:
+        f(Tag<float>(), 1);
+        return true;
+    case ZmPrimType::DOUBLE:
+        f(Tag<double>(), 1);
+        return true;
+    case ZmPrimType::COMPLEX:
+        f(Tag<float>(), 2);
+        return true;
+    case ZmPrimType::USHORT:
+        f(Tag<uint16_t>(), 1);
+        return true;
+    default:
+        return false;
+    }
+}
+
+// --- byte order --------------------------------------------------------------------------------
+
+template <class W>
+inline W byteSwapped(W w)
+{
+    if constexpr (sizeof(W) == 2) {
+        return W(uint16_t(w >> 8 | w << 8));
+    } else if constexpr (sizeof(W) == 4) {
+        return __builtin_bswap32(w);
+    } else {
+        return __builtin_bswap64(w);
+    }
+}
+
+template <class W>
+void swapWords(void* p, uint64_t n)
+{
+    Byte* b = static_cast<Byte*>(p);
+    for (uint64_t i = 0; i < n; ++i) {
+        W w;
+        std::memcpy(&w, b + i * sizeof(W), sizeof(W));
+        w = byteSwapped(w);
+        std::memcpy(b + i * sizeof(W), &w, sizeof(W));
+    }
+}
+
+// --- voxel moves -------------------------------------------------------------------------------
+
+/// Fills \p count elements at \p d with the element at \p value (zeros when null).
+void fillElements(Byte* d, uint64_t count, int size, const void* value)
+{
+    if (count == 0) {
+        return;
+    }
+    const Byte* v = static_cast<const Byte*>(value);
+    bool zero = v == nullptr;
+    if (!zero) {
+        zero = true;
+        for (int k = 0; k < size; ++k) {
+            zero = zero && v[k] == 0;
+        }
+    }
+    const uint64_t bytes = count * uint64_t(size);
+    if (zero || size == 1) {
+        std::memset(d, zero ? 0 : v[0], bytes);
+        return;
+    }
+    std::memcpy(d, v, size_t(size));
+    // Doubling copies: the pattern is repeated from what is already written.
+    for (uint64_t done = uint64_t(size); done < bytes;) {
+        const uint64_t chunk = std::min(done, bytes - done);
+        std::memcpy(d + done, d, chunk);
+        done += chunk;
+    }
+}
+
+/// Moves one voxel: a fixed size becomes one load and store.
+template <int Size>
+struct VoxelMove {
+    static void copy(Byte* d, const Byte* s, uint64_t) { std::memcpy(d, s, Size); }
+};
+template <>
+struct VoxelMove<0> {
+    static void copy(Byte* d, const Byte* s, uint64_t size) { std::memcpy(d, s, size); }
+};
+
+/// In-place axis permutation by following cycles: destination-driven, one voxel in hand (at
+/// \p held) per cycle, one bit per voxel marking the voxels already in place.
+template <int Size>
+void permuteByCycles(Byte* data, uint64_t voxelBytes, const int dims[3], const int perm[3], ZmBitfield& done,
+                     Byte* held)
+{
+    const uint64_t n[3] = {uint64_t(dims[0]), uint64_t(dims[1]), uint64_t(dims[2])};
+    const uint64_t nd[3] = {n[perm[0]], n[perm[1]], n[perm[2]]};
+    const uint64_t oldStride[3] = {1, n[0], n[0] * n[1]};
+    // How far one step along new axis k moves in the old layout.
+    const uint64_t step[3] = {oldStride[perm[0]], oldStride[perm[1]], oldStride[perm[2]]};
+    const uint64_t total = n[0] * n[1] * n[2];
+    auto sourceOf = [&](uint64_t index) {
+        const uint64_t a = index % nd[0];
+        const uint64_t rest = index / nd[0];
+        return a * step[0] + (rest % nd[1]) * step[1] + (rest / nd[1]) * step[2];
+    };
+    using Move = VoxelMove<Size>;
+    for (uint64_t start = 0; start < total; ++start) {
+        if (done[start] != 0) {
+            continue;
+        }
+        uint64_t src = sourceOf(start);
+        if (src == start) {
+            done.set(start);
+            continue;
+        }
+        Move::copy(held, data + start * voxelBytes, voxelBytes);
+        uint64_t cur = start;
+        while (src != start) {
+            Move::copy(data + cur * voxelBytes, data + src * voxelBytes, voxelBytes);
+            done.set(cur);
+            cur = src;
+            src = sourceOf(cur);
+        }
+        Move::copy(data + cur * voxelBytes, held, voxelBytes);
+        done.set(cur);
+    }
+}
+
+// --- down-sampling ------------------------------------------------------------------------------
+
+/// Walks the output slices of a block reduction with the progress protocol: one task, a step per
+/// output slice, a stop at a cancellation. \p slice(oz) reduces one output slice.
+template <class F>
+void forEachOutputSlice(uint64_t outZ, ZmProgressInterface* progress, F&& slice)
+{
+    ProgressScope scope(progress);
+    if (progress != nullptr) {
+        progress->startWorking(int(std::min<uint64_t>(outZ, uint64_t(std::numeric_limits<int>::max()))),
+                               "Down-sampling");
+    }
+    for (uint64_t oz = 0; oz < outZ; ++oz) {
+        if (progress != nullptr && progress->isCanceled()) {
+            return;
+        }
+        slice(oz);
+        if (progress != nullptr) {
+            progress->nextStep();
+        }
+    }
+}
+
+struct Blocks {
+    uint64_t nx, ny, nz;
+    uint64_t bx, by, bz;
+    uint64_t outX, outY, outZ;
+    uint64_t nc;
+    bool valid;
+};
+
+Blocks blocksOf(uint64_t nx, uint64_t ny, uint64_t nz, int bx, int by, int bz, int nc)
+{
+    Blocks b{nx, ny, nz, uint64_t(bx), uint64_t(by), uint64_t(bz), 0, 0, 0, uint64_t(nc), false};
+    if (bx < 1 || by < 1 || bz < 1 || nc < 1) {
+        return b;
+    }
+    b.outX = nx / b.bx;
+    b.outY = ny / b.by;
+    b.outZ = nz / b.bz;
+    b.valid = true;
+    return b;
+}
+
+/// The sum type of a block mean: float for float, double for double, an exact integer otherwise.
+template <class T>
+using SumOf = std::conditional_t<std::is_same_v<T, float>, float,
+                                 std::conditional_t<std::is_same_v<T, double>, double, int64_t>>;
+
+/// Block means of one output slice. The sums of a row of output voxels build up line by line, in
+/// z, y, x order within each block, so the source streams through once.
+template <class T>
+void meanSlice(T* dst, const T* src, const Blocks& b, uint64_t oz)
+{
+    using Sum = SumOf<T>;
+    constexpr uint64_t kChunk = 256; // output values per pass: the sums stay on the stack
+    Sum sums[kChunk]{};
+    const uint64_t rowValues = b.outX * b.nc;
+    // sums[0..count) are set before each use; the analyser cannot follow the chunking.
+    const Sum divisor = Sum(b.bx * b.by * b.bz);
+    const uint64_t lineValues = b.nx * b.nc;
+    for (uint64_t oy = 0; oy < b.outY; ++oy) {
+        T* out = dst + ((oz * b.outY + oy) * b.outX) * b.nc;
+        for (uint64_t first = 0; first < rowValues; first += kChunk) {
+            const uint64_t count = std::min(kChunk, rowValues - first);
+            for (uint64_t k = 0; k < count; ++k) {
+                sums[k] = Sum(0);
+            }
+            for (uint64_t dz = 0; dz < b.bz; ++dz) {
+                for (uint64_t dy = 0; dy < b.by; ++dy) {
+                    const T* line = src + ((oz * b.bz + dz) * b.ny + (oy * b.by + dy)) * lineValues;
+                    for (uint64_t k = 0; k < count; ++k) {
+                        const uint64_t v = first + k;
+                        const uint64_t ox = v / b.nc;
+                        const uint64_t c = v % b.nc;
+                        const T* block = line + ox * b.bx * b.nc + c;
+                        Sum s = sums[k];
+                        for (uint64_t dx = 0; dx < b.bx; ++dx) {
+                            s += Sum(block[dx * b.nc]); // NOLINT(bugprone-signed-char-misuse)
+                        }
+                        sums[k] = s;
+                    }
+                }
+            }
+            for (uint64_t k = 0; k < count; ++k) {
+                out[first + k] =
+                    T(sums[k] / divisor); // NOLINT(clang-analyzer-core.UndefinedBinaryOperatorResult)
+            }
+        }
+    }
+}
+
+/// The 2x2x2 single-component mean, the common case, with the block read as four pairs.
+template <class T>
+void meanSlice222(T* dst, const T* src, const Blocks& b, uint64_t oz)
+{
+    using Sum = SumOf<T>;
+    for (uint64_t oy = 0; oy < b.outY; ++oy) {
+        const T* l00 = src + ((2 * oz) * b.ny + 2 * oy) * b.nx;
+        const T* l01 = l00 + b.nx;
+        const T* l10 = l00 + b.nx * b.ny;
+        const T* l11 = l10 + b.nx;
+        T* out = dst + (oz * b.outY + oy) * b.outX;
+        for (uint64_t ox = 0; ox < b.outX; ++ox) {
+            const uint64_t x = 2 * ox;
+            // z, y, x order, as the general loop sums. Signed bytes are values here.
+            // NOLINTBEGIN(bugprone-signed-char-misuse)
+            Sum s = Sum(l00[x]);
+            s += Sum(l00[x + 1]);
+            s += Sum(l01[x]);
+            s += Sum(l01[x + 1]);
+            s += Sum(l10[x]);
+            s += Sum(l10[x + 1]);
+            s += Sum(l11[x]);
+            s += Sum(l11[x + 1]);
+            // NOLINTEND(bugprone-signed-char-misuse)
+            out[ox] = T(s / Sum(8));
+        }
+    }
+}
+
+template <class T>
+void maxSlice(T* dst, const T* src, const Blocks& b, uint64_t oz)
+{
+    for (uint64_t oy = 0; oy < b.outY; ++oy) {
+        for (uint64_t ox = 0; ox < b.outX; ++ox) {
+            for (uint64_t c = 0; c < b.nc; ++c) {
+                bool first = true;
+                T m = T(0);
+                for (uint64_t dz = 0; dz < b.bz; ++dz) {
+                    for (uint64_t dy = 0; dy < b.by; ++dy) {
+                        const T* line =
+                            src + (((oz * b.bz + dz) * b.ny + (oy * b.by + dy)) * b.nx + ox * b.bx) * b.nc +
+                            c;
+                        for (uint64_t dx = 0; dx < b.bx; ++dx) {
+                            const T v = line[dx * b.nc];
+                            if (first) {
+                                m = v;
+                                first = false;
+                            } else if (v > m) {
+                                m = v;
+                            }
+                        }
+                    }
+                }
+                dst[((oz * b.outY + oy) * b.outX + ox) * b.nc + c] = m;
+            }
+        }
+    }
+}
+
+template <class T>
+void labelSlice(T* dst, const T* src, const Blocks& b, uint64_t oz, T* scratch)
+{
+    const uint64_t blockSize = b.bx * b.by * b.bz;
+    for (uint64_t oy = 0; oy < b.outY; ++oy) {
+        for (uint64_t ox = 0; ox < b.outX; ++ox) {
+            uint64_t k = 0;
+            for (uint64_t dz = 0; dz < b.bz; ++dz) {
+                for (uint64_t dy = 0; dy < b.by; ++dy) {
+                    const T* line = src + ((oz * b.bz + dz) * b.ny + (oy * b.by + dy)) * b.nx + ox * b.bx;
+                    for (uint64_t dx = 0; dx < b.bx; ++dx) {
+                        scratch[k++] = line[dx];
+                    }
+                }
+            }
+            std::sort(scratch, scratch + blockSize);
+            // The longest run of the sorted block; the first (lowest) label wins a tie.
+            T best = scratch[0];
+            uint64_t bestRun = 0;
+            for (uint64_t i = 0; i < blockSize;) {
+                uint64_t j = i + 1;
+                while (j < blockSize && scratch[j] == scratch[i]) {
+                    ++j;
+                }
+                if (j - i > bestRun) {
+                    bestRun = j - i;
+                    best = scratch[i];
+                }
+                i = j;
+            }
+            dst[(oz * b.outY + oy) * b.outX + ox] = best;
+        }
+    }
+}
+
+} // namespace
+
+// --- fill --------------------------------------------------------------------------------------
+
+void ZmRawData::memset(ZmTypedPointer p, int value, int64_t n)
+{
+    void* d = p.data();
+    const ZmPrimType type = p.primType();
+    auto fill = [&](auto v) {
+        using T = decltype(v);
+        T* t = static_cast<T*>(d);
+        for (int64_t i = 0; i < n; ++i) {
+            t[i] = v;
+        }
+    };
+    switch (int(type)) {
+    case ZmPrimType::BYTE:
+        fill(uint8_t(value));
+        break;
+    case ZmPrimType::SHORT:
+        fill(int16_t(value));
+        break;
+    case ZmPrimType::USHORT:
+        fill(uint16_t(value));
+        break;
+    case ZmPrimType::INT:
+        fill(int32_t(value));
+        break;
+    case ZmPrimType::FLOAT:
+        fill(float(value));
+        break;
+    case ZmPrimType::DOUBLE:
+        fill(double(value));
+        break;
+    default:
+        logUnsupported("ZmRawData::memset()", type);
+        break;
+    }
+}
+
+void ZmRawData::memset(ZmTypedPointer p, double value, int64_t n)
+{
+    const ZmPrimType type = p.primType();
+    switch (int(type)) {
+    case ZmPrimType::BYTE:
+    case ZmPrimType::SHORT:
+    case ZmPrimType::INT:
+    case ZmPrimType::USHORT: {
+        // Limited to the int range first: converting a larger double to int is undefined.
+        const double r = std::floor(value + 0.5);
+        memset(p,
+               r != r               ? 0
+               : r <= -2147483648.0 ? std::numeric_limits<int>::min()
+               : r >= 2147483647.0  ? std::numeric_limits<int>::max()
+                                    : int(r),
+               n);
+        break;
+    }
+    case ZmPrimType::FLOAT: {
+        float* t = static_cast<float*>(p.data());
+        const float v = float(value);
+        for (int64_t i = 0; i < n; ++i) {
+            t[i] = v;
+        }
+        break;
+    }
+    case ZmPrimType::DOUBLE: {
+        double* t = static_cast<double*>(p.data());
+        for (int64_t i = 0; i < n; ++i) {
+            t[i] = value;
+        }
+        break;
+    }
+    default:
+        logUnsupported("ZmRawData::memset()", type);
+        break;
+    }
+}
+
+// --- conversion --------------------------------------------------------------------------------
+
+void ZmRawData::memcpy(ZmTypedPointer dst, ZmTypedPointer src, int64_t n)
+{
+    const ZmPrimType dt = dst.primType();
+    const ZmPrimType st = src.primType();
+    if (dt == st) {
+        if (n > 0) {
+            std::memmove(dst.data(), src.data(), size_t(n) * size_t(dt.size()));
+        }
+        return;
+    }
+    if (dt == ZmPrimType::COMPLEX || st == ZmPrimType::COMPLEX) {
+        getTheLogInstance().errorf("ERROR: ZmRawData::memcpy(), complex data are not supported\n");
+        return;
+    }
+    if (int(dt) > ZmPrimType::USHORT) {
+        getTheLogInstance().errorf("Unsupported data type %s in ZmRawData()\n", dt.getName());
+        return;
+    }
+    if (n <= 0) {
+        return;
+    }
+    withNumericType(dt, [&](auto d) {
+        using D = typename decltype(d)::type;
+        withNumericType(st, [&](auto s) {
+            using S = typename decltype(s)::type;
+            convertLoop(static_cast<D*>(dst.data()), static_cast<const S*>(src.data()), uint64_t(n));
+        });
+    });
+}
+
+void ZmRawData::mapLinear(ZmTypedPointer dst, ZmTypedPointer src, uint64_t n, double offset, double scale)
+{
+    const ZmPrimType dt = dst.primType();
+    const ZmPrimType st = src.primType();
+    const float o = float(offset);
+    const float s = float(scale);
+    if (st == ZmPrimType::COMPLEX && dt != ZmPrimType::COMPLEX) {
+        getTheLogInstance().errorf(
+            "ERROR: ZmRawData::mapLinear(), mapping from complex to real is not supported\n");
+        return;
+    }
+    if (dt == ZmPrimType::STRING || st == ZmPrimType::STRING) {
+        logUnsupported("ZmRawData::mapLinear()", ZmPrimType(ZmPrimType::STRING));
+        return;
+    }
+    if (dt == ZmPrimType::COMPLEX) {
+        float* d = static_cast<float*>(dst.data());
+        if (st == ZmPrimType::COMPLEX) {
+            mapLinearLoop(d, static_cast<const float*>(src.data()), 2 * n, o, s);
+            return;
+        }
+        withNumericType(st, [&](auto t) {
+            using S = typename decltype(t)::type;
+            const S* v = static_cast<const S*>(src.data());
+            for (uint64_t i = 0; i < n; ++i) {
+                d[2 * i] = (float(v[i]) + o) * s;
+                d[2 * i + 1] = 0.0f;
+            }
+        });
+        return;
+    }
+    withNumericType(dt, [&](auto d) {
+        using D = typename decltype(d)::type;
+        withNumericType(st, [&](auto t) {
+            using S = typename decltype(t)::type;
+            mapLinearLoop(static_cast<D*>(dst.data()), static_cast<const S*>(src.data()), n, o, s);
+        });
+    });
+}
+
+// --- range -------------------------------------------------------------------------------------
+
+void ZmRawData::getRange(ZmTypedPointer p, uint64_t n, float& min, float& max)
+{
+    if (p.isNull()) {
+        return;
+    }
+    withRangeType(p.primType(), [&](auto tag, uint64_t factor) {
+        using T = typename decltype(tag)::type;
+        const T* v = static_cast<const T*>(p.data());
+        T lo = v[0];
+        T hi = v[0];
+        if (n * factor > 1) {
+            rangeOf(v + 1, n * factor - 1, lo, hi);
+        }
+        min = float(lo);
+        max = float(hi);
+    });
+}
+
+bool ZmRawData::isConstant(ZmTypedPointer p, uint64_t n)
+{
+    bool constant = false;
+    const bool known = withRangeType(p.primType(), [&](auto tag, uint64_t factor) {
+        using T = typename decltype(tag)::type;
+        const uint64_t count = n * factor;
+        if (count == 0) {
+            constant = true;
+            return;
+        }
+        const T* v = static_cast<const T*>(p.data());
+        T lo = v[0];
+        T hi = v[0];
+        // Blocks big enough to stream, small enough to stop early on varying data.
+        constexpr uint64_t kBlock = 16384;
+        for (uint64_t i = 1; i < count; i += kBlock) {
+            rangeOf(v + i, std::min(kBlock, count - i), lo, hi);
+            if (lo < hi) {
+                return;
+            }
+        }
+        constant = true;
+    });
+    return known && constant;
+}
+
+// --- byte order --------------------------------------------------------------------------------
+
+void ZmRawData::swapBytesWord2(void* p, uint64_t n)
+{
+    swapWords<uint16_t>(p, n);
+}
+
+void ZmRawData::swapBytesWord4(void* p, uint64_t n)
+{
+    swapWords<uint32_t>(p, n);
+}
+
+void ZmRawData::swapBytesWord8(void* p, uint64_t n)
+{
+    swapWords<uint64_t>(p, n);
+}
+
+void ZmRawData::swapBytes(ZmTypedPointer p, uint64_t n)
+{
+    const ZmPrimType type = p.primType();
+    switch (type.size()) {
+    case 1:
+        break;
+    case 2:
+        swapBytesWord2(p.data(), n);
+        break;
+    case 4:
+        swapBytesWord4(p.data(), n);
+        break;
+    case 8:
+        // Intended: only a double is one 64-bit word; "complex" and "string" swap as two
+        // 32-bit words each.
+        if (type == ZmPrimType::DOUBLE) {
+            swapBytesWord8(p.data(), n);
+        } else {
+            swapBytesWord4(p.data(), 2 * n);
+        }
+        break;
+    default:
+        getTheLogInstance().warnf("Swapping of %d-byte words not supported.", type.size());
+        break;
+    }
+}
+
+uint64_t ZmRawData::readBigEndian(ZmTypedPointer p, uint64_t n, FILE* f)
+{
+    const uint64_t got = ZmRawData::fread(p.data(), uint64_t(p.primType().size()), n, f);
+    swapBytes(p, got);
+    return got;
+}
+
+uint64_t ZmRawData::readLittleEndian(ZmTypedPointer p, uint64_t n, FILE* f)
+{
+    return ZmRawData::fread(p.data(), uint64_t(p.primType().size()), n, f);
+}
+
+uint64_t ZmRawData::writeBigEndian(ZmTypedPointer p, uint64_t n, FILE* f)
+{
+    swapBytes(p, n);
+    const uint64_t put = ZmRawData::fwrite(p.data(), uint64_t(p.primType().size()), n, f);
+    swapBytes(p, n);
+    return put;
+}
+
+uint64_t ZmRawData::writeLittleEndian(ZmTypedPointer p, uint64_t n, FILE* f)
+{
+    return ZmRawData::fwrite(p.data(), uint64_t(p.primType().size()), n, f);
+}
+
+namespace {
+constexpr uint64_t kStreamChunk = 1048576;
+}
+
+uint64_t ZmRawData::fread(void* buf, uint64_t elemSize, uint64_t n, FILE* f)
+{
+    if (elemSize == 0 || f == nullptr) {
+        return 0;
+    }
+    const uint64_t total = elemSize * n;
+    Byte* b = static_cast<Byte*>(buf);
+    uint64_t done = 0;
+    while (done < total) {
+        const uint64_t chunk = std::min(kStreamChunk, total - done);
+        const uint64_t got = std::fread(b + done, 1, size_t(chunk), f);
+        done += got;
+        if (got < chunk) {
+            break;
+        }
+    }
+    return done / elemSize;
+}
+
+uint64_t ZmRawData::fwrite(void* buf, uint64_t elemSize, uint64_t n, FILE* f)
+{
+    if (elemSize == 0 || f == nullptr) {
+        return 0;
+    }
+    const uint64_t total = elemSize * n;
+    const Byte* b = static_cast<const Byte*>(buf);
+    uint64_t done = 0;
+    for (uint64_t k = 0; k < total / kStreamChunk; ++k) {
+        const uint64_t put = std::fwrite(b + done, 1, size_t(kStreamChunk), f);
+        done += put;
+        if (put < kStreamChunk) {
+            return done / elemSize;
+        }
+    }
+    if (done < total) {
+        done += std::fwrite(b + done, 1, size_t(total - done), f);
+    }
+    return done / elemSize;
+}
+
+// --- axes --------------------------------------------------------------------------------------
+
+bool ZmRawData::swapDims(ZmTypedPointer p, int dims[3], const int perm[3], int nComponents)
+{
+    if (perm[0] == 0 && perm[1] == 1 && perm[2] == 2) {
+        return true;
+    }
+    const bool isPermutation = perm[0] >= 0 && perm[0] <= 2 && perm[1] >= 0 && perm[1] <= 2 && perm[2] >= 0 &&
+                               perm[2] <= 2 && perm[0] != perm[1] && perm[1] != perm[2] && perm[0] != perm[2];
+    if (p.isNull() || !isPermutation || dims[0] < 1 || dims[1] < 1 || dims[2] < 1 || nComponents < 1) {
+        return false;
+    }
+    const int newDims[3] = {dims[perm[0]], dims[perm[1]], dims[perm[2]]};
+    const uint64_t voxels = uint64_t(dims[0]) * uint64_t(dims[1]) * uint64_t(dims[2]);
+    if (isConstant(p, voxels * uint64_t(nComponents))) {
+        std::memcpy(dims, newDims, sizeof newDims);
+        return true;
+    }
+    const ZmPrimType type = p.primType();
+    const int voxelBytes = type.size() * nComponents;
+    const bool moved = voxelBytes == 4 || type == ZmPrimType::BYTE || type == ZmPrimType::SHORT ||
+                       type == ZmPrimType::USHORT || type == ZmPrimType::INT || type == ZmPrimType::FLOAT ||
+                       type == ZmPrimType::DOUBLE;
+    if (!moved) {
+        logUnsupported("ZmRawData::swapDims()", type);
+        return false;
+    }
+    const int lo = std::min({dims[0], dims[1], dims[2]});
+    const int hi = std::max({dims[0], dims[1], dims[2]});
+    const uint64_t middle =
+        uint64_t(dims[0]) + uint64_t(dims[1]) + uint64_t(dims[2]) - uint64_t(lo) - uint64_t(hi);
+    void* scratch = nullptr;
+    try {
+        ZmBitfield done(voxels, ZmBitfield::CLEAR);
+        scratch = zmmalloc(std::max<uint64_t>(2, middle) * uint64_t(hi) * uint64_t(voxelBytes));
+        Byte* data = static_cast<Byte*>(p.data());
+        Byte* held = static_cast<Byte*>(scratch);
+        const uint64_t vb = uint64_t(voxelBytes);
+        switch (voxelBytes) {
+        case 1:
+            permuteByCycles<1>(data, vb, dims, perm, done, held);
+            break;
+        case 2:
+            permuteByCycles<2>(data, vb, dims, perm, done, held);
+            break;
+        case 4:
+            permuteByCycles<4>(data, vb, dims, perm, done, held);
+            break;
+        case 8:
+            permuteByCycles<8>(data, vb, dims, perm, done, held);
+            break;
+        default:
+            permuteByCycles<0>(data, vb, dims, perm, done, held);
+            break;
+        }
+    } catch (const ZmMemoryException&) {
+        zmfree(scratch);
+        return false;
+    }
+    zmfree(scratch);
+    std::memcpy(dims, newDims, sizeof newDims);
+    return true;
+}
+
+int ZmRawData::crop(void*& data, int elemSize, int dims[3], const int boxMin[3], const int boxMax[3],
+                    const void* fillValue)
+{
+    if (elemSize < 1 || dims[0] < 1 || dims[1] < 1 || dims[2] < 1 || data == nullptr) {
+        return 0;
+    }
+    if (boxMin[0] == 0 && boxMin[1] == 0 && boxMin[2] == 0 && boxMax[0] == dims[0] - 1 &&
+        boxMax[1] == dims[1] - 1 && boxMax[2] == dims[2] - 1) {
+        return 1;
+    }
+    int64_t out[3];
+    for (int a = 0; a < 3; ++a) {
+        out[a] = int64_t(boxMax[a]) - int64_t(boxMin[a]) + 1;
+        if (out[a] < 1 || out[a] > std::numeric_limits<int>::max()) {
+            return 0;
+        }
+    }
+    const uint64_t es = uint64_t(elemSize);
+    const uint64_t lineBytes = uint64_t(out[0]) * es;
+    Byte* fresh = nullptr;
+    try {
+        fresh = static_cast<Byte*>(zmmalloc(lineBytes * uint64_t(out[1]) * uint64_t(out[2])));
+    } catch (const ZmMemoryException&) {
+        return 0;
+    }
+    const Byte* src = static_cast<const Byte*>(data);
+    // The part of each box line that lies inside the source: x in [x0, x1).
+    const int64_t x0 = std::max<int64_t>(0, -int64_t(boxMin[0]));
+    const int64_t x1 = std::min<int64_t>(out[0], int64_t(dims[0]) - int64_t(boxMin[0]));
+    for (int64_t z = 0; z < out[2]; ++z) {
+        const int64_t sz = int64_t(boxMin[2]) + z;
+        for (int64_t y = 0; y < out[1]; ++y) {
+            const int64_t sy = int64_t(boxMin[1]) + y;
+            Byte* line = fresh + (uint64_t(z) * uint64_t(out[1]) + uint64_t(y)) * lineBytes;
+            const bool inside = sz >= 0 && sz < dims[2] && sy >= 0 && sy < dims[1] && x0 < x1;
+            if (!inside) {
+                fillElements(line, uint64_t(out[0]), elemSize, fillValue);
+                continue;
+            }
+            fillElements(line, uint64_t(x0), elemSize, fillValue);
+            const Byte* from = src + ((uint64_t(sz) * uint64_t(dims[1]) + uint64_t(sy)) * uint64_t(dims[0]) +
+                                      uint64_t(int64_t(boxMin[0]) + x0)) *
+                                         es;
+            std::memcpy(line + uint64_t(x0) * es, from, uint64_t(x1 - x0) * es);
+            fillElements(line + uint64_t(x1) * es, uint64_t(out[0] - x1), elemSize, fillValue);
+        }
+    }
+    zmfree(data);
+    data = fresh;
+    for (int a = 0; a < 3; ++a) {
+        dims[a] = int(out[a]);
+    }
+    return 1;
+}
+
+int ZmRawData::flip(void* data, int elemSize, const int dims[3], int axis)
+{
+    if (axis < 0 || axis > 2 || dims[0] < 1 || dims[1] < 1 || dims[2] < 1 || data == nullptr ||
+        elemSize < 1) {
+        return 0;
+    }
+    if (dims[axis] == 1) {
+        return 1;
+    }
+    const uint64_t es = uint64_t(elemSize);
+    const uint64_t nx = uint64_t(dims[0]), ny = uint64_t(dims[1]), nz = uint64_t(dims[2]);
+    const uint64_t lineBytes = nx * es;
+    Byte* tmp = nullptr;
+    try {
+        tmp = static_cast<Byte*>(zmmalloc(lineBytes));
+    } catch (const ZmMemoryException&) {
+        return 0;
+    }
+    Byte* d = static_cast<Byte*>(data);
+    auto swapLines = [&](Byte* a, Byte* b) {
+        std::memcpy(tmp, a, lineBytes);
+        std::memcpy(a, b, lineBytes);
+        std::memcpy(b, tmp, lineBytes);
+    };
+    if (axis == 0) {
+        // Each line reversed through the scratch line: one read and one write of every byte.
+        for (uint64_t l = 0; l < ny * nz; ++l) {
+            Byte* line = d + l * lineBytes;
+            std::memcpy(tmp, line, lineBytes);
+            auto reverse = [&](auto tag) {
+                using T = typename decltype(tag)::type;
+                const T* s = reinterpret_cast<const T*>(tmp);
+                T* t = reinterpret_cast<T*>(line);
+                for (uint64_t x = 0; x < nx; ++x) {
+                    std::memcpy(t + x, s + (nx - 1 - x), sizeof(T));
+                }
+            };
+            switch (elemSize) {
+            case 1:
+                reverse(Tag<uint8_t>());
+                break;
+            case 2:
+                reverse(Tag<uint16_t>());
+                break;
+            case 4:
+                reverse(Tag<uint32_t>());
+                break;
+            case 8:
+                reverse(Tag<uint64_t>());
+                break;
+            default:
+                for (uint64_t x = 0; x < nx; ++x) {
+                    std::memcpy(line + x * es, tmp + (nx - 1 - x) * es, es);
+                }
+                break;
+            }
+        }
+    } else if (axis == 1) {
+        for (uint64_t z = 0; z < nz; ++z) {
+            Byte* slice = d + z * ny * lineBytes;
+            for (uint64_t y = 0; y < ny / 2; ++y) {
+                swapLines(slice + y * lineBytes, slice + (ny - 1 - y) * lineBytes);
+            }
+        }
+    } else {
+        const uint64_t sliceBytes = ny * lineBytes;
+        for (uint64_t z = 0; z < nz / 2; ++z) {
+            Byte* a = d + z * sliceBytes;
+            Byte* b = d + (nz - 1 - z) * sliceBytes;
+            for (uint64_t y = 0; y < ny; ++y) {
+                swapLines(a + y * lineBytes, b + y * lineBytes);
+            }
+        }
+    }
+    zmfree(tmp);
+    return 1;
+}
+
+// --- down-sampling -------------------------------------------------------------------------------
+
+namespace {
+
+bool meanType(int code)
+{
+    return code == ZmPrimType::BYTE || code == ZmPrimType::SHORT || code == ZmPrimType::INT ||
+           code == ZmPrimType::FLOAT || code == ZmPrimType::DOUBLE || code == ZmPrimType::USHORT;
+}
+
+void downSampleMeans(void* dst, ZmTypedPointer src, const Blocks& b, ZmProgressInterface* progress)
+{
+    withNumericType(src.primType(), [&](auto tag) {
+        using T = typename decltype(tag)::type;
+        T* d = static_cast<T*>(dst);
+        const T* s = static_cast<const T*>(src.data());
+        const bool pairs = b.bx == 2 && b.by == 2 && b.bz == 2 && b.nc == 1;
+        forEachOutputSlice(b.outZ, progress, [&](uint64_t oz) {
+            if (pairs) {
+                meanSlice222(d, s, b, oz);
+            } else {
+                meanSlice(d, s, b, oz);
+            }
+        });
+    });
+}
+
+} // namespace
+
+void ZmRawData::downSample3D(void* dst, ZmTypedPointer src, uint64_t nx, uint64_t ny, uint64_t nz, int bx,
+                             int by, int bz, ZmProgressInterface* progress)
+{
+    downSample3DN(dst, src, nx, ny, nz, bx, by, bz, 1, progress);
+}
+
+void ZmRawData::downSample3DN(void* dst, ZmTypedPointer src, uint64_t nx, uint64_t ny, uint64_t nz, int bx,
+                              int by, int bz, int nComponents, ZmProgressInterface* progress)
+{
+    if (!meanType(src.primType())) {
+        logUnsupported("ZmRawData::downSample3D", src.primType());
+        return;
+    }
+    const Blocks b = blocksOf(nx, ny, nz, bx, by, bz, nComponents);
+    if (b.valid) {
+        downSampleMeans(dst, src, b, progress);
+    }
+}
+
+void ZmRawData::downSampleLabels3D(void* dst, ZmTypedPointer src, uint64_t nx, uint64_t ny, uint64_t nz,
+                                   int bx, int by, int bz, ZmProgressInterface* progress)
+{
+    const ZmPrimType type = src.primType();
+    if (!type.isInteger()) {
+        logUnsupported("ZmRawData::downSampleLabels3D", type);
+        return;
+    }
+    const Blocks b = blocksOf(nx, ny, nz, bx, by, bz, 1);
+    if (!b.valid) {
+        return;
+    }
+    const uint64_t blockSize = b.bx * b.by * b.bz;
+    withNumericType(type, [&](auto tag) {
+        using T = typename decltype(tag)::type;
+        T* scratch = nullptr;
+        try {
+            scratch = static_cast<T*>(zmmalloc(blockSize * sizeof(T)));
+        } catch (const ZmMemoryException&) {
+            getTheLogInstance().errorf(
+                "ZmRawData::downSampleLabels3D(): no memory for a block of %llu labels\n",
+                static_cast<unsigned long long>(blockSize));
+            return;
+        }
+        forEachOutputSlice(b.outZ, progress, [&](uint64_t oz) {
+            labelSlice(static_cast<T*>(dst), static_cast<const T*>(src.data()), b, oz, scratch);
+        });
+        zmfree(scratch);
+    });
+}
+
+void ZmRawData::downSampleMaxFilterComponents3DN(void* dst, ZmTypedPointer src, uint64_t nx, uint64_t ny,
+                                                 uint64_t nz, int bx, int by, int bz, int nComponents,
+                                                 ZmProgressInterface* progress)
+{
+    const Blocks b = blocksOf(nx, ny, nz, bx, by, bz, nComponents);
+    const bool known = withNumericType(src.primType(), [&](auto tag) {
+        using T = typename decltype(tag)::type;
+        if (!b.valid) {
+            return;
+        }
+        forEachOutputSlice(b.outZ, progress, [&](uint64_t oz) {
+            maxSlice(static_cast<T*>(dst), static_cast<const T*>(src.data()), b, oz);
+        });
+    });
+    if (!known) {
+        logUnsupported("ZmRawData::downSampleMaxFilterComponents3DN", src.primType());
+    }
+}
