@@ -80,7 +80,7 @@ inline D convertValue(S v)
             // int32. Written as selects, which vectorise.
             S c = v < lo ? lo : v;
             c = c > hi ? hi : c;
-            c = v == v ? c : S(0);
+            c = std::isnan(v) ? S(0) : c;
             return D(int32_t(c));
         } else {
             if (std::isnan(v)) {
