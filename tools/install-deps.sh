@@ -7,7 +7,9 @@
 set -euo pipefail
 
 # libeigen3-dev: the tests' and benchmarks' linear-algebra oracle, never linked into the library.
-packages=(make cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev libeigen3-dev)
+# python3-pydicom, python3-numpy: real DICOM pixels and their NumPy oracle for the zmtool raw tests.
+packages=(make cmake ninja-build g++ pkg-config libboost-dev libgtest-dev libgmock-dev libeigen3-dev
+          python3-numpy python3-pydicom)
 for extra in "$@"; do
   case "$extra" in
     bench) packages+=(libbenchmark-dev libspdlog-dev libssl-dev) ;;

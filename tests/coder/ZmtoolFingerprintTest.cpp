@@ -1,5 +1,6 @@
 // zmtool md5 / cksum against the system's md5sum and cksum on the same files: the outputs must be
 // byte-identical and the exit statuses equal.
+#include "RunProgram.h"
 #include "ScratchDir.h"
 
 #include <gtest/gtest.h>
@@ -20,64 +21,14 @@
 
 namespace {
 
-struct Outcome {
-    std::string out;
-    std::string err;
-    int status = -1; // exit status, or -1 when the program did not exit normally
-};
-
-std::string readFile(const std::string& path)
-{
-    std::ifstream in(path, std::ios::binary);
-    std::ostringstream s;
-    s << in.rdbuf();
-    return s.str();
-}
-
-// Runs \p argv in \p dir with standard input from \p inputPath ("" for /dev/null); output is
-// collected in files of \p dir so that no pipe can fill up.
-Outcome runProgram(const ScratchDir& dir, const std::vector<std::string>& argv,
-                   const std::string& inputPath = "")
-{
-    const std::string outPath = dir / ".stdout";
-    const std::string errPath = dir / ".stderr";
-    const pid_t pid = fork();
-    if (pid == 0) {
-        const int in = open(inputPath.empty() ? "/dev/null" : inputPath.c_str(), O_RDONLY);
-        const int out = open(outPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-        const int err = open(errPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-        if (in < 0 || out < 0 || err < 0 || chdir(dir.path().c_str()) != 0 || dup2(in, 0) < 0 ||
-            dup2(out, 1) < 0 || dup2(err, 2) < 0) {
-            _exit(126);
-        }
-        std::vector<char*> args;
-        for (const std::string& a : argv) {
-            args.push_back(const_cast<char*>(a.c_str()));
-        }
-        args.push_back(nullptr);
-        execvp(args[0], args.data());
-        _exit(127);
-    }
-    Outcome r;
-    int status = 0;
-    if (pid > 0 && waitpid(pid, &status, 0) == pid && WIFEXITED(status)) {
-        r.status = WEXITSTATUS(status);
-    }
-    r.out = readFile(outPath);
-    r.err = readFile(errPath);
-    return r;
-}
-
-class ZmtoolFingerprint : public ::testing::Test {
+class ZmtoolFingerprint : public ZmtoolTest {
 protected:
     void SetUp() override
     {
-        const char* tool = std::getenv("ZMTOOL");
-        if (tool == nullptr || tool[0] == 0) {
-            GTEST_SKIP() << "ZMTOOL is not set (the test build sets it to the built zmtool)";
+        ZmtoolTest::SetUp();
+        if (IsSkipped() || HasFatalFailure()) {
+            return;
         }
-        m_tool = tool;
-        ASSERT_FALSE(m_dir.path().empty());
         for (const char* program : {"md5sum", "cksum"}) {
             if (runProgram(m_dir, {program, "--version"}).status != 0) {
                 GTEST_SKIP() << program << " is not available as an oracle";
@@ -104,15 +55,13 @@ protected:
         std::vector<std::string> theirs = {oracle};
         ours.insert(ours.end(), args.begin(), args.end());
         theirs.insert(theirs.end(), args.begin(), args.end());
-        const Outcome a = runProgram(m_dir, ours, input);
-        const Outcome b = runProgram(m_dir, theirs, input);
+        const Outcome a = runProgram(m_dir, ours, {input});
+        const Outcome b = runProgram(m_dir, theirs, {input});
         EXPECT_EQ(a.out, b.out) << command << " vs " << oracle;
         EXPECT_EQ(a.status, b.status) << command << " vs " << oracle << "; our stderr: " << a.err;
         return a;
     }
 
-    std::string m_tool;
-    ScratchDir m_dir;
     std::mt19937 m_rng{2024};
 };
 

@@ -57,6 +57,13 @@ TEST(ZmProgress, NestedTasksShareOneOverallScale)
     EXPECT_TRUE(gui.completed[0].ok());
     p.stopWorking(); // nothing open, not working: nothing happens
     EXPECT_EQ(gui.completed.size(), 1u);
+    // The next run starts again from zero.
+    p.startWorking(4, "again");
+    EXPECT_EQ(gui.maxima.back(), 4);
+    EXPECT_EQ(gui.values.back(), 0);
+    p.nextStep();
+    EXPECT_EQ(gui.values.back(), 1);
+    p.stopWorking();
 }
 
 TEST(ZmProgress, CancelFailAndReattach)

@@ -5,7 +5,9 @@
 
 #include <zmlib/zmlib.h>
 
+#include <algorithm>
 #include <cmath>
+#include <cstdint>
 #include <cstdio>
 #include <string>
 
@@ -279,6 +281,104 @@ void printProcessFigures()
 
 } // namespace
 
+// Prints a run's progress as a row of percentages, one for each quarter reached.
+class QuarterProgress : public ZmProgressGuiInterface {
+public:
+    void showText(const std::string& text) override { std::printf("  %s:", text.c_str()); }
+    void setMaximum(int maximum) override { m_maximum = maximum; }
+    void setValue(int value) override
+    {
+        while (m_maximum > 0 && m_next <= 4 && int64_t(value) * 4 >= int64_t(m_maximum) * m_next) {
+            std::printf(" %d%%", 25 * m_next++);
+        }
+    }
+    void setCompleted(const ZmResult& result) override
+    {
+        std::printf(" (%s)\n", result.ok() ? "done" : result.text());
+    }
+
+private:
+    int m_maximum = 0;
+    int m_next = 1;
+};
+
+std::string md5Of(const void* data, uint64_t bytes)
+{
+    ZmLib::MD5Coder coder;
+    coder.append(data, bytes);
+    ZmString hex;
+    coder.finalize().toString(hex);
+    return hex.getString();
+}
+
+// A CT-like volume in Hounsfield units: air around an elliptic body of soft tissue, two lungs, a
+// spine, and noise from a fixed-seed generator, so that the fingerprint is the same on every run.
+void syntheticCt(short* voxels, int nx, int ny, int nz)
+{
+    uint32_t state = 12345;
+    for (int z = 0; z < nz; ++z) {
+        for (int y = 0; y < ny; ++y) {
+            for (int x = 0; x < nx; ++x) {
+                const double u = (x - nx / 2.0) / (nx * 0.42);
+                const double v = (y - ny / 2.0) / (ny * 0.30);
+                const double lung = std::min(std::hypot(std::fabs(u) - 0.45, v * 1.2), 1.0);
+                const double spine = std::hypot(u * 6, (v - 0.65) * 5);
+                double hu = -1000;
+                if (u * u + v * v < 1) {
+                    hu = lung < 0.35 ? -820 : (spine < 1 ? 700 : 40);
+                }
+                state = state * 1664525u + 1013904223u;
+                voxels[(int64_t(z) * ny + y) * nx + x] = short(hu + int(state >> 27) - 16);
+            }
+        }
+    }
+}
+
+bool demoRawData()
+{
+    heading("raw data: a synthetic CT volume, down-sampled and permuted");
+    const int n[3] = {256, 256, 128};
+    ZmRawData3D ct(n[0], n[1], n[2], 2);
+    short* voxels = static_cast<short*>(ct.dataPtr());
+    syntheticCt(voxels, n[0], n[1], n[2]);
+    const uint64_t count = uint64_t(ct.getNumElems());
+    float low = 0;
+    float high = 0;
+    ZmRawData::getRange(voxels, count, low, high);
+    const std::string fingerprint = md5Of(voxels, count * 2);
+    std::printf("  %d x %d x %d short, range %g .. %g HU, MD5 %s\n", n[0], n[1], n[2], double(low),
+                double(high), fingerprint.c_str());
+
+    // 2x2x2 block means, reported a quarter at a time.
+    ZmRawData3D small(n[0] / 2, n[1] / 2, n[2] / 2, 2);
+    ZmProgressInterface progress;
+    QuarterProgress display;
+    progress.setProgressGui(&display);
+    ZmRawData::downSample3D(small.dataPtr(), voxels, uint64_t(n[0]), uint64_t(n[1]), uint64_t(n[2]), 2, 2, 2,
+                            &progress);
+    float smallLow = 0;
+    float smallHigh = 0;
+    ZmRawData::getRange(static_cast<short*>(small.dataPtr()), uint64_t(small.getNumElems()), smallLow,
+                        smallHigh);
+    const bool within = smallLow >= low && smallHigh <= high;
+    std::printf("  down-sampled 2x2x2: %d x %d x %d, range %g .. %g HU (within the original: %s)\n",
+                small.sizeX(), small.sizeY(), small.sizeZ(), double(smallLow), double(smallHigh),
+                within ? "yes" : "NO");
+
+    // z becomes the fastest axis (each line a column through the slices), and back again.
+    int dims[3] = {n[0], n[1], n[2]};
+    const int order[3] = {2, 0, 1};
+    const int back[3] = {1, 2, 0};
+    const bool permuted = ZmRawData::swapDims(voxels, dims, order, 1);
+    const std::string permutedPrint = md5Of(voxels, count * 2);
+    std::printf("  permuted to axes (z, x, y): %d x %d x %d, MD5 %s\n", dims[0], dims[1], dims[2],
+                permutedPrint.c_str());
+    const bool restored =
+        permuted && ZmRawData::swapDims(voxels, dims, back, 1) && md5Of(voxels, count * 2) == fingerprint;
+    std::printf("  permuted back: %s\n", restored ? "same fingerprint as before" : "DIFFERENT");
+    return within && restored && permutedPrint != fingerprint;
+}
+
 int zmtool::runDemo(int argc, char** argv)
 {
     (void)argv;
@@ -296,7 +396,7 @@ int zmtool::runDemo(int argc, char** argv)
     log.tracef(ZmLogInfo, "demo", "zmlib %s demo started", ZMLIB_VERSION_STRING);
     // The stopwatch writes each step's time to the log ("--- demo [n]: ... msec (+ ... ms)").
     ZmWatch watch("demo", true);
-    bool (*const steps[])() = {demoStrings, demoCore, demoFingerprints, demoGeometry};
+    bool (*const steps[])() = {demoStrings, demoCore, demoFingerprints, demoGeometry, demoRawData};
     bool ok = true;
     int index = 0;
     for (bool (*step)() : steps) {

@@ -1,6 +1,7 @@
 // zmtool md5 / zmtool cksum: file fingerprints with the library's MD5 and CRC, printed exactly as
 // the GNU md5sum and the POSIX cksum commands print them, so that the outputs can be compared or
 // checked with those programs.
+#include "TerminalProgress.h"
 #include "zmtool.h"
 
 #include <zmlib/ZmCoder.h>
@@ -8,9 +9,7 @@
 #include <zmlib/ZmString.h>
 
 #include <fcntl.h>
-#include <sys/ioctl.h>
 #include <sys/stat.h>
-#include <time.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -25,106 +24,6 @@ namespace {
 enum class Kind { Md5, Cksum };
 
 const size_t kChunkSize = size_t(1) << 20;
-
-double now()
-{
-    timespec ts{};
-    clock_gettime(CLOCK_MONOTONIC, &ts);
-    return double(ts.tv_sec) + double(ts.tv_nsec) * 1e-9;
-}
-
-// A one-line progress bar on standard error for files that take more than a second, drawn only
-// when standard error is a terminal and wiped before the result line is printed.
-class ProgressBar {
-public:
-    ProgressBar(const char* name, uint64_t total) : m_name(name), m_total(total), m_start(now())
-    {
-        m_enabled = isatty(2) != 0;
-    }
-    ~ProgressBar() { clear(); }
-    ProgressBar(const ProgressBar&) = delete;
-    ProgressBar& operator=(const ProgressBar&) = delete;
-
-    void update(uint64_t done)
-    {
-        if (!m_enabled) {
-            return;
-        }
-        const double t = now();
-        if (t - m_start < 1.0 || (m_width > 0 && t - m_lastDraw < 0.1)) {
-            return;
-        }
-        m_lastDraw = t;
-        draw(done);
-    }
-
-    void clear()
-    {
-        if (m_width > 0) {
-            std::fprintf(stderr, "\r%*s\r", m_width, "");
-            std::fflush(stderr);
-            m_width = 0;
-        }
-    }
-
-private:
-    void draw(uint64_t done)
-    {
-        int columns = 80;
-        winsize ws{};
-        if (ioctl(2, TIOCGWINSZ, &ws) == 0 && ws.ws_col > 0) {
-            columns = ws.ws_col;
-        }
-        // Stay one column short of the edge so that the terminal never wraps the line.
-        const int room = columns - 1;
-        char tail[64];
-        int barWidth = 0;
-        if (m_total > 0) {
-            const uint64_t shown = done < m_total ? done : m_total;
-            const int percent = int(shown * 100 / m_total);
-            std::snprintf(tail, sizeof tail, "%3d%%", percent);
-            barWidth = room >= 40 ? 30 : room / 3;
-        } else {
-            std::snprintf(tail, sizeof tail, "%" PRIu64 " MiB", done >> 20);
-        }
-        std::string line = m_name;
-        const int fixed = (barWidth > 0 ? barWidth + 3 : 1) + int(std::strlen(tail));
-        const int nameRoom = room - fixed;
-        if (nameRoom < 4) {
-            line.clear();
-        } else if (int(line.size()) > nameRoom) {
-            line = "..." + line.substr(line.size() - size_t(nameRoom - 3));
-        }
-        if (barWidth > 0) {
-            const uint64_t shown = done < m_total ? done : m_total;
-            const int filled = int(shown * uint64_t(barWidth) / m_total);
-            line += " [";
-            line.append(size_t(filled), '#');
-            line.append(size_t(barWidth - filled), '.');
-            line += "]";
-        } else {
-            line += " ";
-        }
-        line += tail;
-        if (int(line.size()) > room) {
-            line.resize(size_t(room > 0 ? room : 0));
-        }
-        const int width = int(line.size());
-        // Pad over whatever a longer previous line left behind.
-        std::fprintf(stderr, "\r%s%*s", line.c_str(), m_width > width ? m_width - width : 0, "");
-        std::fflush(stderr);
-        if (width > m_width) {
-            m_width = width;
-        }
-    }
-
-    std::string m_name;
-    uint64_t m_total;
-    double m_start;
-    double m_lastDraw = 0;
-    bool m_enabled = false;
-    int m_width = 0; // columns to wipe; 0 while nothing is shown
-};
 
 struct Sum {
     ZmLib::MD5Coder md5;
@@ -146,7 +45,8 @@ bool readAll(int fd, Kind kind, const char* name, unsigned char* buffer, Sum& su
     if (fstat(fd, &st) == 0 && S_ISREG(st.st_mode)) {
         total = uint64_t(st.st_size);
     }
-    ProgressBar progress(name, total);
+    zmtool::TerminalProgress progress;
+    progress.begin(name, total, 1.0);
     for (;;) {
         const ssize_t n = read(fd, buffer, kChunkSize);
         if (n < 0) {

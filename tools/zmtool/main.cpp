@@ -20,6 +20,7 @@ const Command kCommands[] = {
     {"cksum", "CRC and size of files, printed as cksum does", zmtool::runCksum},
     {"uuid", "random (version 4) UUIDs, plain or braced", zmtool::runUuid},
     {"orient", "anatomical edge labels and view class of a screen-to-patient matrix", zmtool::runOrient},
+    {"raw", "inspect, convert, flip, crop, permute and down-sample raw volume files", zmtool::runRaw},
 };
 
 void printUsage(FILE* out)

@@ -9,5 +9,6 @@ int runMd5(int argc, char** argv);
 int runCksum(int argc, char** argv);
 int runUuid(int argc, char** argv);
 int runOrient(int argc, char** argv);
+int runRaw(int argc, char** argv);
 
 } // namespace zmtool

@@ -47,6 +47,8 @@ void ZmProgressInterface::startWorking(int maximum, const std::string& text)
         return;
     }
     if (m_levels.empty()) {
+        // A new run: the previous one left its final value behind.
+        m_value = 0;
         m_working = true;
         beforeStartWorking();
     }
