@@ -298,7 +298,9 @@ void checkPermutations(const int shape[3], int nc)
 
 TEST(ZmRawData, SwapDimsMatchesAnOutOfPlacePermutation)
 {
-    const int shapes[][3] = {{7, 5, 3}, {1, 9, 1}, {4, 4, 4}, {13, 1, 6}, {2, 3, 11}};
+    // Past one transposition tile (32), square planes, and a thin middle axis (the other way round).
+    const int shapes[][3] = {{7, 5, 3},  {1, 9, 1},   {4, 4, 4},  {13, 1, 6},
+                             {2, 3, 11}, {40, 40, 3}, {37, 2, 45}};
     for (const auto& s : shapes) {
         checkPermutations<uint8_t>(s, 1);
         checkPermutations<int16_t>(s, 2); // moved as int

@@ -255,43 +255,107 @@ struct VoxelMove<0> {
     static void copy(Byte* d, const Byte* s, uint64_t size) { std::memcpy(d, s, size); }
 };
 
-/// In-place axis permutation by following cycles: destination-driven, one voxel in hand (at
-/// \p held) per cycle, one bit per voxel marking the voxels already in place.
+// In-place axis permutation. Any order of three axes is a product of at most three swaps of
+// neighbouring axes, and each swap is a transposition that moves large pieces:
+// - swapping x and y transposes every z plane: square planes by exchanging voxel pairs tile by
+//   tile, others through the scratch (which holds any plane: it is as big as the two largest
+//   extents make one);
+// - swapping y and z transposes the matrix of x lines, following its cycles one line in hand,
+//   with one bit per line marking the lines already in place.
+// Either moves each voxel once (plus a copy of a plane into the scratch), where following the
+// cycles of the whole permutation voxel by voxel jumps across the volume at every step.
+
+const uint64_t kTransposeTile = 32;
+
+/// Transposes \p planes planes of \p rows x \p cols voxels: plane[r][c] moves to plane[c][r].
 template <int Size>
-void permuteByCycles(Byte* data, uint64_t voxelBytes, const int dims[3], const int perm[3], ZmBitfield& done,
-                     Byte* held)
+void transposePlanes(Byte* data, uint64_t vb, uint64_t rows, uint64_t cols, uint64_t planes, Byte* scratch)
 {
-    const uint64_t n[3] = {uint64_t(dims[0]), uint64_t(dims[1]), uint64_t(dims[2])};
-    const uint64_t nd[3] = {n[perm[0]], n[perm[1]], n[perm[2]]};
-    const uint64_t oldStride[3] = {1, n[0], n[0] * n[1]};
-    // How far one step along new axis k moves in the old layout.
-    const uint64_t step[3] = {oldStride[perm[0]], oldStride[perm[1]], oldStride[perm[2]]};
-    const uint64_t total = n[0] * n[1] * n[2];
-    auto sourceOf = [&](uint64_t index) {
-        const uint64_t a = index % nd[0];
-        const uint64_t rest = index / nd[0];
-        return a * step[0] + (rest % nd[1]) * step[1] + (rest / nd[1]) * step[2];
-    };
     using Move = VoxelMove<Size>;
-    for (uint64_t start = 0; start < total; ++start) {
+    const uint64_t planeBytes = rows * cols * vb;
+    for (uint64_t p = 0; p < planes; ++p) {
+        Byte* plane = data + p * planeBytes;
+        if (Size > 0 && rows == cols) {
+            Byte held[Size > 0 ? Size : 1];
+            for (uint64_t r0 = 0; r0 < rows; r0 += kTransposeTile) {
+                const uint64_t r1 = std::min(r0 + kTransposeTile, rows);
+                for (uint64_t c0 = r0; c0 < cols; c0 += kTransposeTile) {
+                    const uint64_t c1 = std::min(c0 + kTransposeTile, cols);
+                    for (uint64_t r = r0; r < r1; ++r) {
+                        for (uint64_t c = std::max(c0, r + 1); c < c1; ++c) {
+                            Byte* x = plane + (r * cols + c) * vb;
+                            Byte* y = plane + (c * rows + r) * vb;
+                            Move::copy(held, x, vb);
+                            Move::copy(x, y, vb);
+                            Move::copy(y, held, vb);
+                        }
+                    }
+                }
+            }
+            continue;
+        }
+        std::memcpy(scratch, plane, planeBytes);
+        for (uint64_t r0 = 0; r0 < rows; r0 += kTransposeTile) {
+            const uint64_t r1 = std::min(r0 + kTransposeTile, rows);
+            for (uint64_t c0 = 0; c0 < cols; c0 += kTransposeTile) {
+                const uint64_t c1 = std::min(c0 + kTransposeTile, cols);
+                for (uint64_t c = c0; c < c1; ++c) {
+                    for (uint64_t r = r0; r < r1; ++r) {
+                        Move::copy(plane + (c * rows + r) * vb, scratch + (r * cols + c) * vb, vb);
+                    }
+                }
+            }
+        }
+    }
+}
+
+/// Transposes the \p rows x \p cols matrix of lines of \p lineBytes each in place, one line in
+/// hand at \p held; \p done has a clear bit for each line.
+void transposeLines(Byte* data, uint64_t lineBytes, uint64_t rows, uint64_t cols, ZmBitfield& done,
+                    Byte* held)
+{
+    const uint64_t n = rows * cols;
+    auto line = [&](uint64_t k) { return data + k * lineBytes; };
+    // New position k = c * rows + r holds the line that was at r * cols + c; the first and the last
+    // line stay.
+    auto sourceOf = [&](uint64_t k) { return (k % rows) * cols + k / rows; };
+    for (uint64_t start = 1; start + 1 < n; ++start) {
         if (done[start] != 0) {
             continue;
         }
         uint64_t src = sourceOf(start);
         if (src == start) {
-            done.set(start);
             continue;
         }
-        Move::copy(held, data + start * voxelBytes, voxelBytes);
+        std::memcpy(held, line(start), lineBytes);
         uint64_t cur = start;
         while (src != start) {
-            Move::copy(data + cur * voxelBytes, data + src * voxelBytes, voxelBytes);
+            std::memcpy(line(cur), line(src), lineBytes);
             done.set(cur);
             cur = src;
             src = sourceOf(cur);
         }
-        Move::copy(data + cur * voxelBytes, held, voxelBytes);
+        std::memcpy(line(cur), held, lineBytes);
         done.set(cur);
+    }
+}
+
+/// Permutes the axes by swaps of neighbouring axes ('A' swaps x and y, 'B' swaps y and z) given by
+/// \p swaps, of the volume with dims \p n; the bit field has a bit for every line of the volume.
+template <int Size>
+void permuteBySwaps(Byte* data, uint64_t vb, const uint64_t n[3], const char* swaps, ZmBitfield& done,
+                    Byte* scratch)
+{
+    uint64_t d[3] = {n[0], n[1], n[2]};
+    for (const char* s = swaps; *s != 0; ++s) {
+        if (*s == 'A') {
+            transposePlanes<Size>(data, vb, d[1], d[0], d[2], scratch);
+            std::swap(d[0], d[1]);
+        } else {
+            done.unsetAll();
+            transposeLines(data, d[0] * vb, d[2], d[1], done, scratch);
+            std::swap(d[1], d[2]);
+        }
     }
 }
 
@@ -818,32 +882,45 @@ bool ZmRawData::swapDims(ZmTypedPointer p, int dims[3], const int perm[3], int n
         logUnsupported("ZmRawData::swapDims()", type);
         return false;
     }
-    const int lo = std::min({dims[0], dims[1], dims[2]});
-    const int hi = std::max({dims[0], dims[1], dims[2]});
-    const uint64_t middle =
-        uint64_t(dims[0]) + uint64_t(dims[1]) + uint64_t(dims[2]) - uint64_t(lo) - uint64_t(hi);
+    const uint64_t n[3] = {uint64_t(dims[0]), uint64_t(dims[1]), uint64_t(dims[2])};
+    const uint64_t lo = std::min({n[0], n[1], n[2]});
+    const uint64_t hi = std::max({n[0], n[1], n[2]});
+    const uint64_t middle = n[0] + n[1] + n[2] - lo - hi;
+    // The swaps that make new axis i old axis perm[i]; of the two ways to reverse the axes, the
+    // one whose line swap moves the longer lines.
+    const char* swaps = "A";
+    if (perm[0] == 0) {
+        swaps = "B";
+    } else if (perm[0] == 2 && perm[1] == 0) {
+        swaps = "BA";
+    } else if (perm[0] == 1 && perm[1] == 2) {
+        swaps = "AB";
+    } else if (perm[0] == 2) {
+        swaps = n[1] >= std::min(n[0], n[2]) ? "ABA" : "BAB";
+    }
     void* scratch = nullptr;
     try {
-        ZmBitfield done(voxels, ZmBitfield::CLEAR);
-        scratch = zmmalloc(std::max<uint64_t>(2, middle) * uint64_t(hi) * uint64_t(voxelBytes));
+        // Both allocated before anything moves: a failure leaves the data as it was.
+        ZmBitfield done(n[0] * n[1] * n[2] / lo, ZmBitfield::CLEAR);
+        scratch = zmmalloc(std::max<uint64_t>(2, middle) * hi * uint64_t(voxelBytes));
         Byte* data = static_cast<Byte*>(p.data());
         Byte* held = static_cast<Byte*>(scratch);
         const uint64_t vb = uint64_t(voxelBytes);
         switch (voxelBytes) {
         case 1:
-            permuteByCycles<1>(data, vb, dims, perm, done, held);
+            permuteBySwaps<1>(data, vb, n, swaps, done, held);
             break;
         case 2:
-            permuteByCycles<2>(data, vb, dims, perm, done, held);
+            permuteBySwaps<2>(data, vb, n, swaps, done, held);
             break;
         case 4:
-            permuteByCycles<4>(data, vb, dims, perm, done, held);
+            permuteBySwaps<4>(data, vb, n, swaps, done, held);
             break;
         case 8:
-            permuteByCycles<8>(data, vb, dims, perm, done, held);
+            permuteBySwaps<8>(data, vb, n, swaps, done, held);
             break;
         default:
-            permuteByCycles<0>(data, vb, dims, perm, done, held);
+            permuteBySwaps<0>(data, vb, n, swaps, done, held);
             break;
         }
     } catch (const ZmMemoryException&) {

@@ -105,8 +105,10 @@ ZMLIB_API uint64_t write(int fd, const void* buf, uint64_t size);
 /// - Voxels move whole. "byte", "short", "ushort", "int", "float" and "double" work with any
 ///   number of components, and so does any voxel of 4 bytes in all; other types log
 ///   "Unsupported data type %s in ZmRawData::swapDims()" and give false.
-/// - Extra memory: one bit per voxel and a scratch block of max(2, middle extent) lines of the
-///   longest extent. When either cannot be allocated: false, data unchanged.
+/// - Extra memory: at most one bit per voxel (one per line along the shortest axis) and a scratch
+///   block of max(2, middle extent) lines of the longest extent. When either cannot be allocated:
+///   false, data unchanged. The voxels move by plane and line transpositions, close to the speed
+///   of a copy into a second buffer.
 /// - A null pointer, a dim below 1, fewer than 1 component or a \p perm that is not a permutation
 ///   of 0, 1, 2: false, nothing touched.
 ZMLIB_API bool swapDims(ZmTypedPointer p, int dims[3], const int perm[3], int nComponents);
