@@ -415,6 +415,13 @@ TEST(ZmRawData, DownSamplingMatchesTheReference)
         checkMeans<double>(shape, 4, 3, 2, nc);
         checkMeans<uint16_t>(shape, 1, 1, 5, nc);
     }
+    // Long lines through the 2x2x2 paths: the 16-bit vector loop with its tail, and the line
+    // sums in chunks of 512 pairs.
+    const int wide[3] = {1101, 3, 4};
+    checkMeans<int16_t>(wide, 2, 2, 2, 1);
+    checkMeans<uint16_t>(wide, 2, 2, 2, 1);
+    checkMeans<uint8_t>(wide, 2, 2, 2, 1);
+    checkMeans<int32_t>(wide, 2, 2, 2, 1);
     // 5x5x5 in 2x2x2 blocks gives 2x2x2.
     std::vector<float> cube(125, 1.0f), small(9, -1.0f);
     ZmRawData::downSample3D(small.data(), ZmTypedPointer(cube.data()), 5, 5, 5, 2, 2, 2, nullptr);

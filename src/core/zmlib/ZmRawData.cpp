@@ -12,9 +12,56 @@
 #include <limits>
 #include <type_traits>
 
+#if defined(__x86_64__)
+#include <immintrin.h>
+#endif
+
 namespace {
 
 using Byte = unsigned char;
+
+// --- instruction sets ----------------------------------------------------------------------------
+//
+// The element loops are written once, as always-inlined kernels, and compiled twice through thin
+// wrappers: for the baseline of the build and, on x86-64, for AVX2, chosen at run time. The
+// kernels hold no intrinsics: the compiler vectorises the same C++ for each target, so both give
+// the same results (no fused multiply-add is enabled by either).
+#define ZM_KERNEL inline __attribute__((always_inline))
+#define COMMA ,
+#if defined(__x86_64__)
+#define ZM_HAVE_AVX2_KERNELS 1
+#define ZM_AVX2 __attribute__((target("avx2")))
+bool cpuHasAvx2() noexcept
+{
+    static const bool yes = __builtin_cpu_supports("avx2") != 0;
+    return yes;
+}
+// Defines NAME (dispatching), NAME##Avx2 and NAME##Base around the kernel NAME##Kernel; the
+// template parameters and the function parameters are given as they are declared.
+#define ZM_DISPATCHED(TEMPLATE, NAME, PARAMS, ARGS)                                                          \
+    TEMPLATE void NAME##Base PARAMS                                                                          \
+    {                                                                                                        \
+        NAME##Kernel ARGS;                                                                                   \
+    }                                                                                                        \
+    TEMPLATE ZM_AVX2 void NAME##Avx2 PARAMS                                                                  \
+    {                                                                                                        \
+        NAME##Kernel ARGS;                                                                                   \
+    }                                                                                                        \
+    TEMPLATE void NAME PARAMS                                                                                \
+    {                                                                                                        \
+        if (cpuHasAvx2()) {                                                                                  \
+            NAME##Avx2 ARGS;                                                                                 \
+        } else {                                                                                             \
+            NAME##Base ARGS;                                                                                 \
+        }                                                                                                    \
+    }
+#else
+#define ZM_DISPATCHED(TEMPLATE, NAME, PARAMS, ARGS)                                                          \
+    TEMPLATE void NAME PARAMS                                                                                \
+    {                                                                                                        \
+        NAME##Kernel ARGS;                                                                                   \
+    }
+#endif
 
 // --- element types -------------------------------------------------------------------------------
 
@@ -66,7 +113,7 @@ void logUnsupported(const char* where, ZmPrimType type)
 /// \p v in the destination type D: integers saturate, floating values are clamped and truncated
 /// toward zero (NaN gives 0), everything into a floating type converts as C++ converts it.
 template <class D, class S>
-inline D convertValue(S v)
+ZM_KERNEL D convertValue(S v)
 {
     if constexpr (std::is_floating_point_v<D>) {
         return D(v);
@@ -106,56 +153,70 @@ inline D convertValue(S v)
 }
 
 template <class D, class S>
-void convertLoop(D* __restrict d, const S* __restrict s, uint64_t n)
+ZM_KERNEL void convertLoopKernel(D* __restrict d, const S* __restrict s, uint64_t n)
 {
     for (uint64_t i = 0; i < n; ++i) {
         d[i] = convertValue<D>(s[i]);
     }
 }
+ZM_DISPATCHED(template <class D COMMA class S>, convertLoop,
+              (D* __restrict d, const S* __restrict s, uint64_t n), (d, s, n))
 
 template <class D, class S>
-void mapLinearLoop(D* __restrict d, const S* __restrict s, uint64_t n, float offset, float scale)
+ZM_KERNEL void mapLinearLoopKernel(D* __restrict d, const S* __restrict s, uint64_t n, float offset,
+                                   float scale)
 {
     for (uint64_t i = 0; i < n; ++i) {
         const float v = (float(s[i]) + offset) * scale;
         d[i] = convertValue<D>(v);
     }
 }
+ZM_DISPATCHED(template <class D COMMA class S>, mapLinearLoop,
+              (D* __restrict d, const S* __restrict s, uint64_t n, float offset, float scale),
+              (d, s, n, offset, scale))
 
 // --- range -------------------------------------------------------------------------------------
 
 /// The range of p[0..n) under the sequential rule (a value lowers min when below it, else raises
-/// max when above it), in eight independent lanes so that the loop vectorises. The lanes all start
-/// at p[0]; NaN never wins a comparison, so NaN after the first value is passed over as the
-/// sequential rule passes it over.
+/// max when above it), in 64 bytes of independent lanes: a generic vector, which the compiler maps
+/// onto the registers of each target (a float min reduction written as a plain loop would not
+/// vectorise, because of its NaN and signed-zero rules). The lanes all start at the values given;
+/// NaN never wins a comparison, so NaN after the first value is passed over as the sequential rule
+/// passes it over.
 template <class T>
-void rangeOf(const T* p, uint64_t n, T& lo, T& hi)
+ZM_KERNEL void rangeOfKernel(const T* p, uint64_t n, T& lo, T& hi)
 {
-    constexpr int kLanes = 8;
-    T mn[kLanes];
-    T mx[kLanes];
-    for (int k = 0; k < kLanes; ++k) {
-        mn[k] = lo;
-        mx[k] = hi;
+    typedef T Lanes __attribute__((vector_size(16)));
+    constexpr uint64_t kLanes = 16 / sizeof(T);
+    constexpr int kVectors = 4; // independent chains per bound
+    Lanes mn[kVectors];
+    Lanes mx[kVectors];
+    for (int k = 0; k < kVectors; ++k) {
+        mn[k] = Lanes{} + lo;
+        mx[k] = Lanes{} + hi;
     }
     uint64_t i = 0;
-    for (; i + kLanes <= n; i += kLanes) {
-        for (int k = 0; k < kLanes; ++k) {
-            const T v = p[i + uint64_t(k)];
+    for (; i + kVectors * kLanes <= n; i += kVectors * kLanes) {
+        for (int k = 0; k < kVectors; ++k) {
+            Lanes v;
+            std::memcpy(&v, p + i + uint64_t(k) * kLanes, sizeof v);
             mn[k] = v < mn[k] ? v : mn[k];
             mx[k] = v > mx[k] ? v : mx[k];
         }
     }
+    for (int k = 0; k < kVectors; ++k) {
+        for (uint64_t j = 0; j < kLanes; ++j) {
+            lo = mn[k][j] < lo ? mn[k][j] : lo;
+            hi = mx[k][j] > hi ? mx[k][j] : hi;
+        }
+    }
     for (; i < n; ++i) {
         const T v = p[i];
-        mn[0] = v < mn[0] ? v : mn[0];
-        mx[0] = v > mx[0] ? v : mx[0];
-    }
-    for (int k = 0; k < kLanes; ++k) {
-        lo = mn[k] < lo ? mn[k] : lo;
-        hi = mx[k] > hi ? mx[k] : hi;
+        lo = v < lo ? v : lo;
+        hi = v > hi ? v : hi;
     }
 }
+ZM_DISPATCHED(template <class T>, rangeOf, (const T* p, uint64_t n, T& lo, T& hi), (p, n, lo, hi))
 
 /// Calls f(Tag<T>(), count factor) for the types that getRange and isConstant cover; complex is
 /// read as floats, two per element.
@@ -188,6 +249,29 @@ bool withRangeType(int code, F&& f)
         return false;
     }
 }
+
+// --- exchanging memory ------------------------------------------------------------------------
+
+/// Exchanges \p n bytes between \p a and \p b (which do not overlap) in 8-byte words, a loop the
+/// compiler vectorises; each byte is read and written once, with no trip through a scratch buffer.
+ZM_KERNEL void exchangeBytesKernel(Byte* __restrict a, Byte* __restrict b, uint64_t n)
+{
+    uint64_t i = 0;
+    for (; i + 8 <= n; i += 8) {
+        uint64_t x;
+        uint64_t y;
+        std::memcpy(&x, a + i, 8);
+        std::memcpy(&y, b + i, 8);
+        std::memcpy(a + i, &y, 8);
+        std::memcpy(b + i, &x, 8);
+    }
+    for (; i < n; ++i) {
+        const Byte x = a[i];
+        a[i] = b[i];
+        b[i] = x;
+    }
+}
+ZM_DISPATCHED(, exchangeBytes, (Byte* __restrict a, Byte* __restrict b, uint64_t n), (a, b, n))
 
 // --- byte order --------------------------------------------------------------------------------
 
@@ -451,11 +535,89 @@ void meanSlice(T* dst, const T* src, const Blocks& b, uint64_t oz)
     }
 }
 
-/// The 2x2x2 single-component mean, the common case, with the block read as four pairs.
-template <class T>
-void meanSlice222(T* dst, const T* src, const Blocks& b, uint64_t oz)
+#if defined(ZM_HAVE_AVX2_KERNELS)
+/// 16-bit 2x2x2 means of \p pairs output values from four source lines, 16 at a time: each
+/// multiply-add with ones sums the horizontal pairs of a line into 32 bits, four of them give the
+/// block sums, which are divided by 8 with truncation toward zero and packed back. Unsigned values
+/// are moved into the signed range first (x - 32768) and the bias added back to the sums. Returns
+/// the number of values done; the caller finishes the rest.
+ZM_AVX2 inline __m256i pairSumsAvx2(const void* at, __m256i flip)
 {
-    using Sum = SumOf<T>;
+    const __m256i v = _mm256_loadu_si256(static_cast<const __m256i*>(at));
+    return _mm256_madd_epi16(_mm256_xor_si256(v, flip), _mm256_set1_epi16(1));
+}
+
+template <class T>
+ZM_AVX2 inline __m256i blockMeansAvx2(const T* l00, const T* l01, const T* l10, const T* l11, uint64_t x)
+{
+    constexpr bool isUnsigned = std::is_unsigned_v<T>;
+    const __m256i flip = _mm256_set1_epi16(int16_t(isUnsigned ? 0x8000 : 0));
+    __m256i sum =
+        _mm256_add_epi32(_mm256_add_epi32(pairSumsAvx2(l00 + x, flip), pairSumsAvx2(l01 + x, flip)),
+                         _mm256_add_epi32(pairSumsAvx2(l10 + x, flip), pairSumsAvx2(l11 + x, flip)));
+    sum = _mm256_add_epi32(sum, _mm256_set1_epi32(isUnsigned ? 8 * 32768 : 0));
+    // Truncation toward zero: negative sums are rounded up by adding 7 before the shift.
+    sum = _mm256_add_epi32(sum, _mm256_and_si256(_mm256_srai_epi32(sum, 31), _mm256_set1_epi32(7)));
+    return _mm256_srai_epi32(sum, 3);
+}
+
+template <class T>
+ZM_AVX2 uint64_t mean222Avx2(T* out, const T* l00, const T* l01, const T* l10, const T* l11, uint64_t pairs)
+{
+    static_assert(sizeof(T) == 2, "16-bit values only");
+    uint64_t k = 0;
+    for (; k + 16 <= pairs; k += 16) {
+        const __m256i low = blockMeansAvx2(l00, l01, l10, l11, 2 * k);
+        const __m256i high = blockMeansAvx2(l00, l01, l10, l11, 2 * k + 16);
+        // Packing works within 128-bit halves; the permutation puts the four quarters in order.
+        const __m256i packed =
+            std::is_unsigned_v<T> ? _mm256_packus_epi32(low, high) : _mm256_packs_epi32(low, high);
+        _mm256_storeu_si256(reinterpret_cast<__m256i*>(out + k), _mm256_permute4x64_epi64(packed, 0xD8));
+    }
+    return k;
+}
+#endif
+
+/// The 2x2x2 single-component mean, the common case, with the block read as four pairs. Eight
+/// values of at most 16 bits sum exactly in 32 bits, which vectorise twice as wide as 64. Integer
+/// sums are exact in any order, so they add the four lines first (a plain vertical sum) and then
+/// the pairs; float sums keep the z, y, x order of the general loop.
+template <class T>
+ZM_KERNEL void meanSlice222Kernel(T* dst, const T* src, const Blocks& b, uint64_t oz)
+{
+    using Sum = std::conditional_t<std::is_integral_v<T> && sizeof(T) <= 2, int32_t, SumOf<T>>;
+    if constexpr (std::is_integral_v<T>) {
+        constexpr uint64_t kChunk = 512; // pairs per pass: the line sums stay on the stack
+        Sum lines[2 * kChunk];
+        for (uint64_t oy = 0; oy < b.outY; ++oy) {
+            const T* l00 = src + ((2 * oz) * b.ny + 2 * oy) * b.nx;
+            const T* l01 = l00 + b.nx;
+            const T* l10 = l00 + b.nx * b.ny;
+            const T* l11 = l10 + b.nx;
+            T* out = dst + (oz * b.outY + oy) * b.outX;
+            uint64_t done = 0;
+#if defined(ZM_HAVE_AVX2_KERNELS)
+            if constexpr (sizeof(T) == 2) {
+                if (cpuHasAvx2()) {
+                    done = mean222Avx2(out, l00, l01, l10, l11, b.outX);
+                }
+            }
+#endif
+            for (uint64_t first = done; first < b.outX; first += kChunk) {
+                const uint64_t pairs = std::min(kChunk, b.outX - first);
+                const uint64_t x0 = 2 * first;
+                // NOLINTBEGIN(bugprone-signed-char-misuse): signed bytes are values here
+                for (uint64_t x = 0; x < 2 * pairs; ++x) {
+                    lines[x] = Sum(l00[x0 + x]) + Sum(l01[x0 + x]) + Sum(l10[x0 + x]) + Sum(l11[x0 + x]);
+                }
+                // NOLINTEND(bugprone-signed-char-misuse)
+                for (uint64_t k = 0; k < pairs; ++k) {
+                    out[first + k] = T((lines[2 * k] + lines[2 * k + 1]) / Sum(8));
+                }
+            }
+        }
+        return;
+    }
     for (uint64_t oy = 0; oy < b.outY; ++oy) {
         const T* l00 = src + ((2 * oz) * b.ny + 2 * oy) * b.nx;
         const T* l01 = l00 + b.nx;
@@ -479,6 +641,8 @@ void meanSlice222(T* dst, const T* src, const Blocks& b, uint64_t oz)
         }
     }
 }
+ZM_DISPATCHED(template <class T>, meanSlice222, (T * dst, const T* src, const Blocks& b, uint64_t oz),
+              (dst, src, b, oz))
 
 template <class T>
 void maxSlice(T* dst, const T* src, const Blocks& b, uint64_t oz)
@@ -1006,11 +1170,6 @@ int ZmRawData::flip(void* data, int elemSize, const int dims[3], int axis)
         return 0;
     }
     Byte* d = static_cast<Byte*>(data);
-    auto swapLines = [&](Byte* a, Byte* b) {
-        std::memcpy(tmp, a, lineBytes);
-        std::memcpy(a, b, lineBytes);
-        std::memcpy(b, tmp, lineBytes);
-    };
     if (axis == 0) {
         // Each line reversed through the scratch line: one read and one write of every byte.
         for (uint64_t l = 0; l < ny * nz; ++l) {
@@ -1048,7 +1207,7 @@ int ZmRawData::flip(void* data, int elemSize, const int dims[3], int axis)
         for (uint64_t z = 0; z < nz; ++z) {
             Byte* slice = d + z * ny * lineBytes;
             for (uint64_t y = 0; y < ny / 2; ++y) {
-                swapLines(slice + y * lineBytes, slice + (ny - 1 - y) * lineBytes);
+                exchangeBytes(slice + y * lineBytes, slice + (ny - 1 - y) * lineBytes, lineBytes);
             }
         }
     } else {
@@ -1056,9 +1215,7 @@ int ZmRawData::flip(void* data, int elemSize, const int dims[3], int axis)
         for (uint64_t z = 0; z < nz / 2; ++z) {
             Byte* a = d + z * sliceBytes;
             Byte* b = d + (nz - 1 - z) * sliceBytes;
-            for (uint64_t y = 0; y < ny; ++y) {
-                swapLines(a + y * lineBytes, b + y * lineBytes);
-            }
+            exchangeBytes(a, b, sliceBytes);
         }
     }
     zmfree(tmp);
