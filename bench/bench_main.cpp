@@ -123,10 +123,12 @@ struct Measure {
 };
 
 // The time a case is judged by: CPU time, or the wall-clock time for cases registered with
-// UseRealTime() (threaded cases, where the CPU time of one thread says little).
+// UseRealTime() (threaded cases, where the CPU time of one thread says little), or the time a
+// case measured itself (UseManualTime(): a peer timed in another process).
 double cpuNanoseconds(const benchmark::BenchmarkReporter::Run& run)
 {
-    const bool realTime = run.benchmark_name().find("/real_time") != std::string::npos;
+    const bool realTime = run.benchmark_name().find("/real_time") != std::string::npos ||
+                          run.benchmark_name().find("/manual_time") != std::string::npos;
     const double t = realTime ? run.GetAdjustedRealTime() : run.GetAdjustedCPUTime();
     return t / benchmark::GetTimeUnitMultiplier(run.time_unit) * 1e9;
 }
@@ -450,7 +452,9 @@ std::string writeMarkdown(const CollectingReporter& reporter, const std::string&
     std::ostringstream out;
     out << "## " << title << "\n\n";
     out << "Median of " << repetitions << (repetitions == 1 ? " run" : " repetitions")
-        << " of the CPU time per iteration (the wall-clock time for cases marked real_time); ratio = zmlib "
+        << " of the CPU time per iteration (the wall-clock time for cases marked real_time, the time "
+           "measured by "
+           "the case for manual_time); ratio = zmlib "
            "time / peer time.";
     if (targets > 0) {
         out << " Targets met: " << met << " of " << targets << ".";

@@ -16,7 +16,9 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <map>
 #include <random>
+#include <string>
 #include <vector>
 
 ZMBENCH_TARGET("ZmRawData_memcpy", 1.25, "same-type copy of 256 MiB (peer: memcpy of the same bytes)");
@@ -228,7 +230,7 @@ void CropPeer(benchmark::State& state)
 BENCHMARK(CropZm)->Name("ZmRawData_crop/zm")->Unit(benchmark::kMillisecond);
 BENCHMARK(CropPeer)->Name("ZmRawData_crop/peer")->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(memcpyPeer, crop, kBytes / 8)
-    ->Name("ZmRawData_crop/warm-memcpy")
+    ->Name("ZmRawData_crop/peer-warm-memcpy")
     ->Unit(benchmark::kMillisecond);
 
 void MapLinearZm(benchmark::State& state)
@@ -444,6 +446,69 @@ void SwapDimsGather(benchmark::State& state)
 }
 BENCHMARK(SwapDimsZm)->Name("ZmRawData_swapDims/zm")->DenseRange(0, 4)->Unit(benchmark::kMillisecond);
 BENCHMARK(SwapDimsPeer)->Name("ZmRawData_swapDims/peer")->DenseRange(0, 4)->Unit(benchmark::kMillisecond);
-BENCHMARK(SwapDimsGather)->Name("ZmRawData_swapDims/gather")->DenseRange(0, 4)->Unit(benchmark::kMillisecond);
+BENCHMARK(SwapDimsGather)
+    ->Name("ZmRawData_swapDims/peer-gather")
+    ->DenseRange(0, 4)
+    ->Unit(benchmark::kMillisecond);
+
+// NumPy doing the same operations (bench/numpy_rawdata.py, run once): its median times are
+// reported beside the library's as manual times.
+const std::map<std::string, double>& numpyTimes()
+{
+    static const std::map<std::string, double> times = [] {
+        std::map<std::string, double> t;
+        std::FILE* p = popen("/usr/bin/python3 " ZMBENCH_NUMPY_SCRIPT " 2>/dev/null", "r");
+        char name[128];
+        double seconds = 0;
+        while (p != nullptr && std::fscanf(p, "%127s %lf", name, &seconds) == 2) {
+            t[name] = seconds;
+        }
+        if (p != nullptr) {
+            pclose(p);
+        }
+        return t;
+    }();
+    return times;
+}
+
+void NumpyPeer(benchmark::State& state, const char* name)
+{
+    const auto it = numpyTimes().find(name);
+    if (it == numpyTimes().end()) {
+        state.SkipWithError("NumPy not available (python3-numpy)");
+        return;
+    }
+    for (auto _ : state) {
+        state.SetIterationTime(it->second);
+    }
+}
+
+const char* const kNumpyCases[][2] = {
+    {"ZmRawData_convert/short-byte", "ZmRawData_convert/short-byte/peer-numpy"},
+    {"ZmRawData_convert/float-short", "ZmRawData_convert/float-short/peer-numpy"},
+    {"ZmRawData_convert/ushort-float", "ZmRawData_convert/ushort-float/peer-numpy"},
+    {"ZmRawData_convert/int-double", "ZmRawData_convert/int-double/peer-numpy"},
+    {"ZmRawData_mapLinear", "ZmRawData_mapLinear/peer-numpy"},
+    {"ZmRawData_flip/0", "ZmRawData_flip/peer-numpy/0"},
+    {"ZmRawData_flip/1", "ZmRawData_flip/peer-numpy/1"},
+    {"ZmRawData_flip/2", "ZmRawData_flip/peer-numpy/2"},
+    {"ZmRawData_downSample/short", "ZmRawData_downSample/short/peer-numpy"},
+    {"ZmRawData_downSample/float", "ZmRawData_downSample/float/peer-numpy"},
+    {"ZmRawData_swapDims/0", "ZmRawData_swapDims/peer-numpy/0"},
+    {"ZmRawData_swapDims/1", "ZmRawData_swapDims/peer-numpy/1"},
+    {"ZmRawData_swapDims/2", "ZmRawData_swapDims/peer-numpy/2"},
+    {"ZmRawData_swapDims/3", "ZmRawData_swapDims/peer-numpy/3"},
+    {"ZmRawData_swapDims/4", "ZmRawData_swapDims/peer-numpy/4"},
+};
+
+[[maybe_unused]] const bool kNumpyRegistered = [] {
+    for (const auto& c : kNumpyCases) {
+        benchmark::RegisterBenchmark(c[1], NumpyPeer, c[0])
+            ->UseManualTime()
+            ->Iterations(1)
+            ->Unit(benchmark::kMillisecond);
+    }
+    return true;
+}();
 
 } // namespace

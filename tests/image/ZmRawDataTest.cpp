@@ -422,6 +422,7 @@ TEST(ZmRawData, DownSamplingMatchesTheReference)
     checkMeans<uint16_t>(wide, 2, 2, 2, 1);
     checkMeans<uint8_t>(wide, 2, 2, 2, 1);
     checkMeans<int32_t>(wide, 2, 2, 2, 1);
+    checkMeans<float>(wide, 2, 2, 2, 1);
     // 5x5x5 in 2x2x2 blocks gives 2x2x2.
     std::vector<float> cube(125, 1.0f), small(9, -1.0f);
     ZmRawData::downSample3D(small.data(), ZmTypedPointer(cube.data()), 5, 5, 5, 2, 2, 2, nullptr);

@@ -239,6 +239,10 @@ Options parseArguments(int argc, char** argv)
     const bool writes = o.command != "info";
     for (int i = 1; i < argc; ++i) {
         std::string arg = argv[i];
+        if (arg == "--help" || arg == "-h") {
+            std::fputs(kUsageText, stdout);
+            throw Exit{0};
+        }
         if (arg.size() < 2 || arg[0] != '-') {
             if (!o.input.empty()) {
                 fail(kUsage, "more than one input file ('%s' and '%s')", o.input.c_str(), arg.c_str());

@@ -37,7 +37,9 @@ bool cpuHasAvx2() noexcept
     return yes;
 }
 // Defines NAME (dispatching), NAME##Avx2 and NAME##Base around the kernel NAME##Kernel; the
-// template parameters and the function parameters are given as they are declared.
+// template parameters and the function parameters are given as they are declared (which is why
+// they cannot stand in parentheses).
+// NOLINTBEGIN(bugprone-macro-parentheses)
 #define ZM_DISPATCHED(TEMPLATE, NAME, PARAMS, ARGS)                                                          \
     TEMPLATE void NAME##Base PARAMS                                                                          \
     {                                                                                                        \
@@ -55,6 +57,7 @@ bool cpuHasAvx2() noexcept
             NAME##Base ARGS;                                                                                 \
         }                                                                                                    \
     }
+// NOLINTEND(bugprone-macro-parentheses)
 #else
 #define ZM_DISPATCHED(TEMPLATE, NAME, PARAMS, ARGS)                                                          \
     TEMPLATE void NAME PARAMS                                                                                \
@@ -276,7 +279,7 @@ ZM_DISPATCHED(, exchangeBytes, (Byte* __restrict a, Byte* __restrict b, uint64_t
 // --- byte order --------------------------------------------------------------------------------
 
 template <class W>
-inline W byteSwapped(W w)
+ZM_KERNEL W byteSwapped(W w)
 {
     if constexpr (sizeof(W) == 2) {
         return W(uint16_t(w >> 8 | w << 8));
@@ -288,7 +291,7 @@ inline W byteSwapped(W w)
 }
 
 template <class W>
-void swapWords(void* p, uint64_t n)
+ZM_KERNEL void swapWordsKernel(void* p, uint64_t n)
 {
     Byte* b = static_cast<Byte*>(p);
     for (uint64_t i = 0; i < n; ++i) {
@@ -297,6 +300,17 @@ void swapWords(void* p, uint64_t n)
         w = byteSwapped(w);
         std::memcpy(b + i * sizeof(W), &w, sizeof(W));
     }
+}
+// The baseline (SSE2) has no byte shuffle: the 32-bit reversal takes shifts there.
+template <class W>
+struct SwapWords {
+    static ZM_KERNEL void swapWordsKernel(void* p, uint64_t n) { ::swapWordsKernel<W>(p, n); }
+    ZM_DISPATCHED(static, swapWords, (void* p, uint64_t n), (p, n))
+};
+template <class W>
+void swapWords(void* p, uint64_t n)
+{
+    SwapWords<W>::swapWords(p, n);
 }
 
 // --- voxel moves -------------------------------------------------------------------------------
@@ -360,7 +374,7 @@ void transposePlanes(Byte* data, uint64_t vb, uint64_t rows, uint64_t cols, uint
     for (uint64_t p = 0; p < planes; ++p) {
         Byte* plane = data + p * planeBytes;
         if (Size > 0 && rows == cols) {
-            Byte held[Size > 0 ? Size : 1];
+            Byte held[std::max(Size, 1)];
             for (uint64_t r0 = 0; r0 < rows; r0 += kTransposeTile) {
                 const uint64_t r1 = std::min(r0 + kTransposeTile, rows);
                 for (uint64_t c0 = r0; c0 < cols; c0 += kTransposeTile) {
@@ -576,6 +590,31 @@ ZM_AVX2 uint64_t mean222Avx2(T* out, const T* l00, const T* l01, const T* l10, c
     }
     return k;
 }
+
+/// Float 2x2x2 means, 8 at a time, in the z, y, x order of the scalar loop: the even and the odd
+/// values of each line are separated by shuffles within 128-bit halves (which leaves the results
+/// in the order 0 1 4 5 2 3 6 7, put right before the store). Returns the number of values done.
+ZM_AVX2 uint64_t mean222Avx2(float* out, const float* l00, const float* l01, const float* l10,
+                             const float* l11, uint64_t pairs)
+{
+    uint64_t k = 0;
+    for (; k + 8 <= pairs; k += 8) {
+        const uint64_t x = 2 * k;
+        const float* lines[4] = {l00, l01, l10, l11};
+        __m256 sum = _mm256_setzero_ps();
+        for (int l = 0; l < 4; ++l) {
+            const __m256 a = _mm256_loadu_ps(lines[l] + x);
+            const __m256 b = _mm256_loadu_ps(lines[l] + x + 8);
+            const __m256 even = _mm256_shuffle_ps(a, b, 0x88);
+            const __m256 odd = _mm256_shuffle_ps(a, b, 0xDD);
+            sum = l == 0 ? _mm256_add_ps(even, odd) : _mm256_add_ps(_mm256_add_ps(sum, even), odd);
+        }
+        // Dividing by 8 and multiplying by 1/8 round the same exact value.
+        const __m256 mean = _mm256_mul_ps(sum, _mm256_set1_ps(0.125f));
+        _mm256_storeu_ps(out + k, _mm256_castpd_ps(_mm256_permute4x64_pd(_mm256_castps_pd(mean), 0xD8)));
+    }
+    return k;
+}
 #endif
 
 /// The 2x2x2 single-component mean, the common case, with the block read as four pairs. Eight
@@ -588,7 +627,7 @@ ZM_KERNEL void meanSlice222Kernel(T* dst, const T* src, const Blocks& b, uint64_
     using Sum = std::conditional_t<std::is_integral_v<T> && sizeof(T) <= 2, int32_t, SumOf<T>>;
     if constexpr (std::is_integral_v<T>) {
         constexpr uint64_t kChunk = 512; // pairs per pass: the line sums stay on the stack
-        Sum lines[2 * kChunk];
+        Sum lines[2 * kChunk]{};         // zeroed only so that the analyser sees every read initialised
         for (uint64_t oy = 0; oy < b.outY; ++oy) {
             const T* l00 = src + ((2 * oz) * b.ny + 2 * oy) * b.nx;
             const T* l01 = l00 + b.nx;
@@ -624,7 +663,15 @@ ZM_KERNEL void meanSlice222Kernel(T* dst, const T* src, const Blocks& b, uint64_
         const T* l10 = l00 + b.nx * b.ny;
         const T* l11 = l10 + b.nx;
         T* out = dst + (oz * b.outY + oy) * b.outX;
-        for (uint64_t ox = 0; ox < b.outX; ++ox) {
+        uint64_t done = 0;
+#if defined(ZM_HAVE_AVX2_KERNELS)
+        if constexpr (std::is_same_v<T, float>) {
+            if (cpuHasAvx2()) {
+                done = mean222Avx2(out, l00, l01, l10, l11, b.outX);
+            }
+        }
+#endif
+        for (uint64_t ox = done; ox < b.outX; ++ox) {
             const uint64_t x = 2 * ox;
             // z, y, x order, as the general loop sums. Signed bytes are values here.
             // NOLINTBEGIN(bugprone-signed-char-misuse)
