@@ -35,7 +35,8 @@ file "$build/src/libzmlib.so."*.*.* | grep -q 'ARM aarch64' ||
 echo "ci-cross-aarch64: built for aarch64 in $((SECONDS - start)) s"
 
 # Under qemu-user the platform-independent suites run: containers, strings, results, object model,
-# identifiers, fingerprints, geometry (the portable kernels) and presets. The thread, file, log
+# identifiers, fingerprints, geometry (the portable kernels), presets, progress and raw data (the
+# portable forms of its loops). The thread, file, log
 # and shared-memory suites stay on the native builds: emulated atomics and futexes make their
 # stress tests run for many minutes, and a test cannot start another aarch64 program (zmtool)
 # without a binfmt handler, which is not assumed. The UUID tests that block system calls with a
@@ -45,7 +46,7 @@ echo "ci-cross-aarch64: built for aarch64 in $((SECONDS - start)) s"
 suites='^(ZmDArray|ZmString|ZmStdString|ZmMemory|ZmException|ZmAllocator|FailureInjection|ZmBitfield'
 suites+='|ZmPackedIndexing|ZmSuperPacked|StringUtils|zmWildMatch|ZmVersion|ZmResult|ZmCoder|ZmLibMD5|ZmID'
 suites+='|ZmUUID|ZmVec|ZmMat|ZmRotation|ZmPlane|ZmLine|ZmSphere|ZmOrientation|ZmGeometry|ZmWindowLevel'
-suites+='|ZmHandable|ZmTypeInfo|ZmInterface|ZmEditable|ZmCallable)[A-Za-z0-9_]*\.'
+suites+='|ZmHandable|ZmTypeInfo|ZmInterface|ZmEditable|ZmCallable|ZmPrimType|ZmRawData|ZmProgress)[A-Za-z0-9_]*\.'
 ctest --test-dir "$build" -j 2 --timeout 300 --output-on-failure -R "$suites" \
       -E 'Zmtool|ZmUUID\.(FallsBackToUrandom|NilWhenNoRandom)|ZmHandableThreaded\.Concurrent|ZmMemory\.Refused'
 echo "ci-cross-aarch64: tests under qemu-aarch64 done after $((SECONDS - start)) s"
