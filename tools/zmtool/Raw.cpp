@@ -645,6 +645,9 @@ int crop(Run& run)
         if (o.boxMax[a] < o.boxMin[a]) {
             fail(kUsage, "the box is empty along axis %d (max %d below min %d)", a, o.boxMax[a], o.boxMin[a]);
         }
+        if (int64_t(o.boxMax[a]) - int64_t(o.boxMin[a]) >= int64_t(INT_MAX)) {
+            fail(kUsage, "the box is wider than %d voxels along axis %d", INT_MAX, a);
+        }
     }
     Volume v;
     load(run, v, nullptr);
