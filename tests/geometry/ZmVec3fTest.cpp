@@ -1,4 +1,6 @@
 // ZmVec3f, the MathUtils predicates and the small geometry value types.
+#include "../FileCapture.h"
+
 #include <zmlib/MathUtils.h>
 #include <zmlib/ZmBox2f.h>
 #include <zmlib/ZmBox3f.h>
@@ -35,14 +37,7 @@ ZmVec3f randomVec(std::mt19937& rng, float range = 10.0f)
 
 std::string printed(const ZmVec3f& v)
 {
-    char* buf = nullptr;
-    size_t len = 0;
-    FILE* fp = open_memstream(&buf, &len);
-    v.print(fp);
-    std::fclose(fp);
-    std::string s(buf, len);
-    std::free(buf);
-    return s;
+    return writtenToFile([&](FILE* f) { v.print(f); });
 }
 
 } // namespace

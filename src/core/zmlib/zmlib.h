@@ -2,6 +2,10 @@
 /// Umbrella header: includes every public header of the library.
 #pragma once
 
+#include <zmlib/HxParamBase.h>
+#include <zmlib/HxParamBundle.h>
+#include <zmlib/HxParamEditCheck.h>
+#include <zmlib/HxParameter.h>
 #include <zmlib/KvSessionContextID.h>
 #include <zmlib/MathUtils.h>
 #include <zmlib/StringUtils.h>
