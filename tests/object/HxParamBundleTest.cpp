@@ -168,6 +168,10 @@ TEST(HxParamBundle, CopyMoveAndDuplicate)
     EXPECT_EQ(dst.bundle("Sub", 0)->size(), 2);
     dst.copyAll(src);
     EXPECT_NE(dst.find("secret"), nullptr);
+    const std::string before = printed(dst);
+    dst.copy(dst);
+    dst.copyAll(dst);
+    EXPECT_EQ(printed(dst), before);
 
     HxParamBundle empty("E");
     std::unique_ptr<HxParamBase> twin(src.duplicate());

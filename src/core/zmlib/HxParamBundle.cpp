@@ -420,7 +420,8 @@ void HxParamBundle::move(HxParamBundle& source)
 
 void HxParamBundle::copy(const HxParamBase& source)
 {
-    if (source.flag(NO_COPY) != 0) {
+    // A bundle copied into itself would grow the array it walks; the result would equal it anyway.
+    if (source.flag(NO_COPY) != 0 || &source == this) {
         return;
     }
     if (!source.isBundle()) {
@@ -449,6 +450,9 @@ void HxParamBundle::copy(const HxParamBase& source)
 
 void HxParamBundle::copyAll(const HxParamBase& source)
 {
+    if (&source == this) {
+        return;
+    }
     if (!source.isBundle()) {
         HxParamBase* copy = source.duplicate();
         copy->setEditCheck(source.m_editCheck);

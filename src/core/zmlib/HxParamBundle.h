@@ -93,6 +93,7 @@ public:
     /// Merges \p source into this bundle, skipping nodes with flag 0x0002: a parameter is
     /// duplicated and inserted; a bundle's children are appended when this bundle was empty,
     /// otherwise sub-bundles of known names are merged recursively and everything else replaces.
+    /// Copying a bundle into itself does nothing.
     void copy(const HxParamBase& source);
     /// As `copy`, without the flag test and the empty-target shortcut, and carrying each child's
     /// edit check over to its duplicate.
