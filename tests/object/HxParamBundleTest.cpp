@@ -14,7 +14,9 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
+#include <random>
 #include <string>
+#include <vector>
 
 namespace {
 
@@ -271,4 +273,95 @@ TEST(HxParamBundle, DicomTagsEnhancedSetsAndPrivateCreators)
     // The generated creators are transient: in a string, not in a file.
     EXPECT_NE(printed(root).find("PrivateCreators {"), std::string::npos);
     EXPECT_EQ(printedToFile(root).find("PrivateCreators"), std::string::npos);
+}
+
+namespace {
+
+// A random tree of every value type, with texts full of quotes, backslashes and line breaks.
+void grow(HxParamBundle& b, std::mt19937& rng, int depth)
+{
+    const char* const names[] = {"a", "Voxel size", "3D", "M\xfcller", "x.y", "", "G0029-0010"};
+    const char* const texts[] = {"", "plain", "a\"b\\", "ends\\ ", "line\nbreak", "\\\"", " lead", "\\\\"};
+    const int children = int(rng() % 6);
+    for (int i = 0; i < children; ++i) {
+        const char* name = names[rng() % 7];
+        switch (rng() % 7) {
+        case 0:
+            if (depth < 4) {
+                auto* sub = new HxParamBundle(name);
+                b.insert(sub, 0);
+                grow(*sub, rng, depth + 1);
+            }
+            break;
+        case 1:
+            b.insert(new HxParameter(name, texts[rng() % 8]), 0);
+            break;
+        default: {
+            const ZmPrimType::Type types[] = {ZmPrimType::BYTE,   ZmPrimType::SHORT,  ZmPrimType::INT,
+                                              ZmPrimType::FLOAT,  ZmPrimType::DOUBLE, ZmPrimType::COMPLEX,
+                                              ZmPrimType::USHORT, ZmPrimType::UINT,   ZmPrimType::SBYTE};
+            const ZmPrimType type = types[rng() % 9];
+            const int n = int(rng() % 4);
+            std::vector<unsigned char> bytes(size_t(n * type.size()));
+            for (unsigned char& c : bytes) {
+                c = static_cast<unsigned char>(rng());
+            }
+            b.insert(new HxParameter(name, n, type, bytes.data()), 0);
+            break;
+        }
+        }
+    }
+}
+
+} // namespace
+
+TEST(HxParamBundle, ParseReadsBothPrintFormsBack)
+{
+    std::mt19937 rng(11);
+    for (int round = 0; round < 300; ++round) {
+        HxParamBundle tree("Root");
+        grow(tree, rng, 0);
+        for (const std::string& text : {printed(tree), printedToFile(tree)}) {
+            HxParamBundle back("Other");
+            const ZmResult r = back.parse(text.data(), text.size());
+            ASSERT_TRUE(r.ok()) << r.text() << "\n" << text;
+            EXPECT_EQ(printed(back), printed(tree)) << text;
+        }
+    }
+
+    // Values read back as printed: the space after a final backslash goes, types are inferred.
+    const char text[] = "K {\n    s \"x\\ \",\n    f 0.5 1.25,\n    d 0.333333333333\n    i -3 4\n}\n";
+    HxParamBundle k("K");
+    ASSERT_TRUE(k.parse(text, std::strlen(text)).ok());
+    EXPECT_STREQ(k.find("s")->getString(), "x\\");
+    EXPECT_EQ(int(k.find("f")->primType()), ZmPrimType::FLOAT);
+    EXPECT_EQ(int(k.find("d")->primType()), ZmPrimType::DOUBLE);
+    EXPECT_EQ(int(k.find("i")->primType()), ZmPrimType::INT);
+
+    // Malformed input: the place and what was expected; the bundle stays as it was.
+    const struct {
+        const char* text;
+        const char* message;
+    } bad[] = {
+        {"", "line 1, column 1: expected a bundle name"},
+        {"A {\n  x 1 2 y\n}\n", "line 2, column 5: expected numbers or a quoted text as the value"},
+        {"A {\n  s \"open\n}\n", "line 2, column 5: expected the closing quote of the text that starts here"},
+        {"A {\n  B {\n  }\n", "line 4, column 1: expected \"}\" closing the bundle"},
+        {"A {\n}\n}\n", "line 3, column 1: expected the end of the text after the bundle"},
+        {"A\n", "line 1, column 2: expected \"{\" and the end of the line after the bundle name"},
+    };
+    HxParamBundle keep("Keep");
+    keep.set("v", 1);
+    for (const auto& c : bad) {
+        const ZmResult r = keep.parse(c.text, std::strlen(c.text));
+        EXPECT_EQ(r.code(), ZmResult::InvalidArgument);
+        EXPECT_STREQ(r.text(), c.message) << c.text;
+    }
+    EXPECT_EQ(printed(keep), "Keep {\n    v 1\n}\n");
+    std::string deep;
+    for (int i = 0; i < 1100; ++i) {
+        deep += "B {\n";
+    }
+    EXPECT_NE(std::string(keep.parse(deep.data(), deep.size()).text()).find("1000 nested"),
+              std::string::npos);
 }

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <string>
@@ -1232,4 +1233,277 @@ void HxParamBundle::printInto(ZmString& out, int level, const char* name, bool t
     }
     out += indent.c_str();
     out += "}\n";
+}
+
+// --- input -----------------------------------------------------------------------------------------
+
+namespace {
+
+// A reader of the text form over [p, end), tracking line and column for its messages.
+class TextReader {
+public:
+    TextReader(const char* text, uint64_t length) : m_p(text), m_end(text + length) {}
+
+    bool failed() const { return !m_error.empty(); }
+    const std::string& error() const { return m_error; }
+
+    // name " {" NL children "}" NL, into \p into (its name and children).
+    void bundle(HxParamBundle& into, int depth)
+    {
+        skipBlanks();
+        const std::string name = word();
+        if (name.empty()) {
+            return fail("a bundle name");
+        }
+        skipSpaces();
+        if (!take('{') || !endOfLine()) {
+            return fail("\"{\" and the end of the line after the bundle name");
+        }
+        into.setName(name.c_str());
+        if (depth > kMaxDepth) {
+            return fail("at most 1000 nested bundles");
+        }
+        for (;;) {
+            skipBlanks();
+            if (m_p == m_end) {
+                return fail("\"}\" closing the bundle");
+            }
+            if (*m_p == '}') {
+                ++m_p;
+                ++m_column;
+                if (!endOfLine()) {
+                    return fail("the end of the line after \"}\"");
+                }
+                return;
+            }
+            child(into, depth);
+            if (failed()) {
+                return;
+            }
+        }
+    }
+
+    void skipBlanks()
+    {
+        while (m_p != m_end && (*m_p == ' ' || *m_p == '\t' || *m_p == '\r' || *m_p == '\n')) {
+            advance();
+        }
+    }
+
+    bool atEnd() const { return m_p == m_end; }
+
+    void fail(const char* expected)
+    {
+        if (m_error.empty()) {
+            m_error = "line " + std::to_string(m_line) + ", column " + std::to_string(m_column) +
+                      ": expected " + expected;
+        }
+    }
+
+private:
+    static constexpr int kMaxDepth = 1000;
+
+    void child(HxParamBundle& into, int depth)
+    {
+        const char* start = m_p;
+        const int line = m_line;
+        const int column = m_column;
+        const std::string name = word();
+        if (name.empty()) {
+            return fail("a parameter or bundle name");
+        }
+        skipSpaces();
+        if (m_p != m_end && *m_p == '{') {
+            // A sub-bundle: read it again from its name.
+            m_p = start;
+            m_line = line;
+            m_column = column;
+            auto* sub = new HxParamBundle(nullptr);
+            into.insert(sub, 0);
+            return bundle(*sub, depth + 1);
+        }
+        if (m_p != m_end && *m_p == '"') {
+            std::string text;
+            if (!quoted(text)) {
+                return;
+            }
+            into.insert(new HxParameter(name.c_str(), text.c_str()), 0);
+        } else {
+            const char* from = m_p;
+            const int fromLine = m_line;
+            const int fromColumn = m_column;
+            while (m_p != m_end && *m_p != '\n' && *m_p != ',') {
+                advance();
+            }
+            std::vector<double> values;
+            ZmPrimType::Type type = ZmPrimType::INT;
+            if (!numbers(std::string(from, size_t(m_p - from)), values, type)) {
+                m_p = from;
+                m_line = fromLine;
+                m_column = fromColumn;
+                return fail("numbers or a quoted text as the value");
+            }
+            const int n = int(values.size());
+            if (type == ZmPrimType::INT) {
+                const std::vector<int> ints(values.begin(), values.end());
+                into.insert(new HxParameter(name.c_str(), n, ints.data()), 0);
+            } else if (type == ZmPrimType::FLOAT) {
+                const std::vector<float> floats(values.begin(), values.end());
+                into.insert(new HxParameter(name.c_str(), n, floats.data()), 0);
+            } else {
+                into.insert(new HxParameter(name.c_str(), n, values.data()), 0);
+            }
+        }
+        take(',');
+        if (!endOfLine()) {
+            fail("the end of the line after the value");
+        }
+    }
+
+    // A quoted text: \" is a quote; a final backslash was printed with a space after it.
+    bool quoted(std::string& text)
+    {
+        const char* open = m_p;
+        const int openLine = m_line;
+        const int openColumn = m_column;
+        advance(); // the opening quote
+        while (m_p != m_end) {
+            const char c = *m_p;
+            if (c == '"') {
+                advance();
+                if (text.size() >= 2 && text[text.size() - 1] == ' ' && text[text.size() - 2] == '\\') {
+                    text.pop_back();
+                }
+                return true;
+            }
+            if (c == '\\' && m_p + 1 != m_end && m_p[1] == '"') {
+                advance();
+                advance();
+                text += '"';
+                continue;
+            }
+            text += c;
+            advance();
+        }
+        m_p = open; // the message points at the quote that was never closed
+        m_line = openLine;
+        m_column = openColumn;
+        fail("the closing quote of the text that starts here");
+        return false;
+    }
+
+    // The numbers of a value and the narrowest type that prints them back as written: "int"
+    // for whole numbers in the int range, "float" when "%.8g" of each value as a float gives its
+    // text again, "double" otherwise.
+    static bool numbers(const std::string& field, std::vector<double>& values, ZmPrimType::Type& type)
+    {
+        const char* p = field.c_str();
+        bool whole = true;
+        bool asFloat = true;
+        for (;;) {
+            while (*p == ' ' || *p == '\t' || *p == '\r') {
+                ++p;
+            }
+            if (*p == 0) {
+                break;
+            }
+            char* end = nullptr;
+            const double v = std::strtod(p, &end);
+            if (end == p || (*end != 0 && *end != ' ' && *end != '\t' && *end != '\r')) {
+                return false;
+            }
+            bool isInt = v >= -2147483648.0 && v <= 2147483647.0;
+            for (const char* c = p; c != end && isInt; ++c) {
+                isInt = (*c >= '0' && *c <= '9') || (c == p && *c == '-');
+            }
+            if (!isInt && asFloat) {
+                char again[32];
+                std::snprintf(again, sizeof again, "%.8g", double(float(v)));
+                asFloat = std::string(p, size_t(end - p)) == again;
+            }
+            whole = whole && isInt;
+            values.push_back(v);
+            p = end;
+        }
+        type = whole ? ZmPrimType::INT : asFloat ? ZmPrimType::FLOAT : ZmPrimType::DOUBLE;
+        return true;
+    }
+
+    std::string word()
+    {
+        const char* from = m_p;
+        while (m_p != m_end && *m_p != ' ' && *m_p != '\t' && *m_p != '\n' && *m_p != '\r' && *m_p != '{' &&
+               *m_p != '}' && *m_p != '"' && *m_p != ',') {
+            advance();
+        }
+        return std::string(from, size_t(m_p - from));
+    }
+
+    void skipSpaces()
+    {
+        while (m_p != m_end && (*m_p == ' ' || *m_p == '\t' || *m_p == '\r')) {
+            advance();
+        }
+    }
+
+    bool take(char c)
+    {
+        if (m_p != m_end && *m_p == c) {
+            advance();
+            return true;
+        }
+        return false;
+    }
+
+    bool endOfLine()
+    {
+        skipSpaces();
+        if (m_p == m_end) {
+            return true;
+        }
+        if (*m_p == '\n') {
+            advance();
+            return true;
+        }
+        return false;
+    }
+
+    void advance()
+    {
+        if (*m_p == '\n') {
+            ++m_line;
+            m_column = 1;
+        } else {
+            ++m_column;
+        }
+        ++m_p;
+    }
+
+    const char* m_p;
+    const char* m_end;
+    int m_line = 1;
+    int m_column = 1;
+    std::string m_error;
+};
+
+} // namespace
+
+ZmResult HxParamBundle::parse(const char* text, uint64_t length)
+{
+    HxParamBundle read(nullptr);
+    TextReader reader(text != nullptr ? text : "", text != nullptr ? length : 0);
+    reader.bundle(read, 0);
+    if (!reader.failed()) {
+        reader.skipBlanks();
+        if (!reader.atEnd()) {
+            reader.fail("the end of the text after the bundle");
+        }
+    }
+    if (reader.failed()) {
+        return ZmResult(ZmResult::InvalidArgument, reader.error().c_str(), nullptr);
+    }
+    setName(read.name());
+    destroyChildren();
+    takeChildrenFrom(read);
+    return ZmResult();
 }

@@ -5,6 +5,7 @@
 #include <zmlib/HxParamBase.h>
 #include <zmlib/HxParameter.h>
 #include <zmlib/ZmDArray.h>
+#include <zmlib/ZmResult.h>
 
 #include <atomic>
 #include <cstdint>
@@ -211,6 +212,20 @@ public:
     void print(ZmString& out, int level = 0, const char* name = nullptr) const;
     /// The FILE form (see the class comment), written with one fwrite.
     void print(FILE* file, int level = 0, const char* name = nullptr) const;
+
+    // --- input ---------------------------------------------------------------------------------
+
+    /// Reads the text form (either form `print` writes) of one bundle: on success this bundle
+    /// takes its name and children (the old children are destroyed); on failure nothing changes
+    /// and the result is `ZmResult::InvalidArgument` with the text "line L, column C: what was
+    /// expected". The text form carries no types, so they are inferred: a quoted value is a
+    /// text, a list of whole numbers that fit an int is "int", a list that "%.8g" prints back
+    /// as written is "float", any other list of numbers "double", an empty value an "int" of
+    /// dimension 0. So print, parse and print again gives
+    /// the same text, and parse, print and parse again gives an equal tree. A text printed with
+    /// a space added after a final backslash reads back without the space. Nesting deeper than
+    /// 1000 levels is refused.
+    ZmResult parse(const char* text, uint64_t length);
 
 private:
     static constexpr uint32_t kSortedBit = 0x80000000u;
