@@ -1392,6 +1392,36 @@ private:
         return false;
     }
 
+    // Whether [p, p + n) is an integer as "%d" writes it: digits without leading zeros, a '-'
+    // before anything but 0.
+    static bool isIntText(const char* p, size_t n)
+    {
+        const size_t sign = n > 0 && p[0] == '-' ? 1 : 0;
+        if (n == sign || n - sign > 10 || (p[sign] == '0' && n - sign > 1) || (sign == 1 && p[1] == '0')) {
+            return false;
+        }
+        for (size_t i = sign; i < n; ++i) {
+            if (p[i] < '0' || p[i] > '9') {
+                return false;
+            }
+        }
+        return true;
+    }
+
+    // The digits of a number's mantissa after its leading zeros.
+    static int significantDigits(const char* p, size_t n)
+    {
+        int digits = 0;
+        bool leading = true;
+        for (size_t i = 0; i < n && p[i] != 'e' && p[i] != 'E'; ++i) {
+            if (p[i] >= '0' && p[i] <= '9') {
+                leading = leading && p[i] == '0';
+                digits += leading ? 0 : 1;
+            }
+        }
+        return digits;
+    }
+
     // The numbers of a value and the narrowest type that prints them back as written: "int"
     // for whole numbers in the int range, "float" when "%.8g" of each value as a float gives its
     // text again, "double" otherwise.
@@ -1412,14 +1442,15 @@ private:
             if (end == p || (*end != 0 && *end != ' ' && *end != '\t' && *end != '\r')) {
                 return false;
             }
-            bool isInt = v >= -2147483648.0 && v <= 2147483647.0;
-            for (const char* c = p; c != end && isInt; ++c) {
-                isInt = (*c >= '0' && *c <= '9') || (c == p && *c == '-');
-            }
-            if (!isInt && asFloat) {
+            const size_t length = size_t(end - p);
+            const bool isInt = isIntText(p, length) && v >= -2147483648.0 && v <= 2147483647.0;
+            // "%.8g" writes at most 8 significant digits: only such tokens can be floats, and
+            // only those are printed again to compare (printing is the slow part of reading).
+            if (asFloat) {
                 char again[32];
-                std::snprintf(again, sizeof again, "%.8g", double(float(v)));
-                asFloat = std::string(p, size_t(end - p)) == again;
+                asFloat = significantDigits(p, length) <= 8 &&
+                          std::snprintf(again, sizeof again, "%.8g", double(float(v))) == int(length) &&
+                          std::memcmp(again, p, length) == 0;
             }
             whole = whole && isInt;
             values.push_back(v);

@@ -219,7 +219,7 @@ public:
     /// takes its name and children (the old children are destroyed); on failure nothing changes
     /// and the result is `ZmResult::InvalidArgument` with the text "line L, column C: what was
     /// expected". The text form carries no types, so they are inferred: a quoted value is a
-    /// text, a list of whole numbers that fit an int is "int", a list that "%.8g" prints back
+    /// text, a list of integers written as "%d" writes them is "int", a list that "%.8g" prints back
     /// as written is "float", any other list of numbers "double", an empty value an "int" of
     /// dimension 0. So print, parse and print again gives
     /// the same text, and parse, print and parse again gives an equal tree. A text printed with
