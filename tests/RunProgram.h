@@ -14,6 +14,8 @@
 #include <string>
 #include <vector>
 
+using Args = std::vector<std::string>;
+
 struct Outcome {
     std::string out;
     std::string err;

@@ -19,8 +19,6 @@
 
 namespace {
 
-using Args = std::vector<std::string>;
-
 class ZmtoolRaw : public ZmtoolTest {
 protected:
     void SetUp() override

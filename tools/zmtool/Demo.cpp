@@ -379,6 +379,38 @@ bool demoRawData()
     return within && restored && permutedPrint != fingerprint;
 }
 
+bool demoBundles()
+{
+    heading("parameter bundles: a DICOM-like header");
+    HxParamBundle header("CT_Chest");
+    header.setTag("G0008-0060", "CT");
+    header.setTag("G0028-0030", "0.625\\0.625");
+    header.setTag("G0018-0050", "1.25");
+    header.dicomAll()->setPrivateTagInAll("ACME Recon 2", "G0029-xx10", "soft tissue kernel");
+    const float size[3] = {0.625f, 0.625f, 1.25f};
+    header.set("VoxelSize", 3, size);
+    header.bundle("Series 2 Thorax", 1)->set("Slices", 212);
+    ZmString text;
+    header.print(text);
+    std::printf("%s", text.getString());
+    ZmDArray<float> spacing;
+    const bool haveSpacing = header.findTag("G0028-0030", spacing) != 0 && spacing.size() == 2;
+    std::printf("  pixel spacing (0028,0030): %g x %g mm\n", haveSpacing ? double(spacing[0]) : 0.0,
+                haveSpacing ? double(spacing[1]) : 0.0);
+    std::printf("  private (0029,xx10) of \"ACME Recon 2\": %s\n",
+                header.findPrivateTag("ACME Recon 2", "G0029-xx10", "(none)"));
+    std::printf("  the series found by its alias \"Thorax\": %s\n",
+                header.bundle("thorax") != nullptr ? header.bundle("thorax")->name() : "(none)");
+    // The text reads back into a tree that prints the same.
+    HxParamBundle back("Back");
+    const bool readBack = back.parse(text.getString(), uint64_t(text.length())).ok();
+    ZmString again;
+    back.print(again);
+    const bool same = readBack && again == text;
+    std::printf("  printed, read back and printed again: %s\n", same ? "same text" : "DIFFERENT");
+    return haveSpacing && same;
+}
+
 int zmtool::runDemo(int argc, char** argv)
 {
     (void)argv;
@@ -396,7 +428,8 @@ int zmtool::runDemo(int argc, char** argv)
     log.tracef(ZmLogInfo, "demo", "zmlib %s demo started", ZMLIB_VERSION_STRING);
     // The stopwatch writes each step's time to the log ("--- demo [n]: ... msec (+ ... ms)").
     ZmWatch watch("demo", true);
-    bool (*const steps[])() = {demoStrings, demoCore, demoFingerprints, demoGeometry, demoRawData};
+    bool (*const steps[])() = {demoStrings,  demoCore,    demoFingerprints,
+                               demoGeometry, demoBundles, demoRawData};
     bool ok = true;
     int index = 0;
     for (bool (*step)() : steps) {

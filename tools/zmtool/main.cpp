@@ -21,6 +21,7 @@ const Command kCommands[] = {
     {"uuid", "random (version 4) UUIDs, plain or braced", zmtool::runUuid},
     {"orient", "anatomical edge labels and view class of a screen-to-patient matrix", zmtool::runOrient},
     {"raw", "inspect, convert, flip, crop, permute and down-sample raw volume files", zmtool::runRaw},
+    {"bundle", "print parameter trees and read values by path or DICOM tag", zmtool::runBundle},
 };
 
 void printUsage(FILE* out)

@@ -10,5 +10,6 @@ int runCksum(int argc, char** argv);
 int runUuid(int argc, char** argv);
 int runOrient(int argc, char** argv);
 int runRaw(int argc, char** argv);
+int runBundle(int argc, char** argv);
 
 } // namespace zmtool
