@@ -87,18 +87,11 @@ void parseNumbers(const char* text, int n, T* out)
     }
 }
 
-// The block digits of a private creator name "GGGGG-00BB": each character is taken as its
-// distance from '0' (blocks are written that way, so 10 to 15 appear as ':' to '?'), and the hex
-// letters A-F as well.
-int blockDigit(char c)
+// The value of a hex digit, -1 for anything else.
+int hexDigit(char c)
 {
-    if (c >= 'A' && c <= 'F') {
-        return c - 'A' + 10;
-    }
-    if (c >= 'a' && c <= 'f') {
-        return c - 'a' + 10;
-    }
-    return c >= '0' && c <= '?' ? c - '0' : -1;
+    const int u = std::toupper(static_cast<unsigned char>(c));
+    return u >= '0' && u <= '9' ? u - '0' : u >= 'A' && u <= 'F' ? u - 'A' + 10 : -1;
 }
 
 bool isCreatorName(const char* name)
@@ -106,7 +99,7 @@ bool isCreatorName(const char* name)
     if (std::strlen(name) != 10 || name[6] != '0' || name[7] != '0') {
         return false;
     }
-    const int d = blockDigit(name[4]);
+    const int d = hexDigit(name[4]);
     return d >= 0 && (d & 1) != 0; // private groups are odd
 }
 
@@ -952,8 +945,7 @@ bool HxParamBundle::replaceTag(const ZmString& in, ZmString& out)
     auto hex = [&](int from, unsigned& v) {
         v = 0;
         for (int i = from; i < from + 4; ++i) {
-            const int c = std::toupper(static_cast<unsigned char>(in.getString()[i]));
-            const int d = c >= '0' && c <= '9' ? c - '0' : c >= 'A' && c <= 'F' ? c - 'A' + 10 : -1;
+            const int d = hexDigit(in.getString()[i]);
             if (d < 0) {
                 return false;
             }

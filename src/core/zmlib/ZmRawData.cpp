@@ -629,38 +629,9 @@ template <class T>
 ZM_KERNEL void meanSlice222Kernel(T* dst, const T* src, const Blocks& b, uint64_t oz)
 {
     using Sum = std::conditional_t<std::is_integral_v<T> && sizeof(T) <= 2, int32_t, SumOf<T>>;
-    if constexpr (std::is_integral_v<T>) {
-        constexpr uint64_t kChunk = 512; // pairs per pass: the line sums stay on the stack
-        Sum lines[2 * kChunk]{};         // zeroed only so that the analyser sees every read initialised
-        for (uint64_t oy = 0; oy < b.outY; ++oy) {
-            const T* l00 = src + ((2 * oz) * b.ny + 2 * oy) * b.nx;
-            const T* l01 = l00 + b.nx;
-            const T* l10 = l00 + b.nx * b.ny;
-            const T* l11 = l10 + b.nx;
-            T* out = dst + (oz * b.outY + oy) * b.outX;
-            uint64_t done = 0;
-#if defined(ZM_HAVE_AVX2_KERNELS)
-            if constexpr (sizeof(T) == 2) {
-                if (cpuHasAvx2()) {
-                    done = mean222Avx2(out, l00, l01, l10, l11, b.outX);
-                }
-            }
-#endif
-            for (uint64_t first = done; first < b.outX; first += kChunk) {
-                const uint64_t pairs = std::min(kChunk, b.outX - first);
-                const uint64_t x0 = 2 * first;
-                // NOLINTBEGIN(bugprone-signed-char-misuse): signed bytes are values here
-                for (uint64_t x = 0; x < 2 * pairs; ++x) {
-                    lines[x] = Sum(l00[x0 + x]) + Sum(l01[x0 + x]) + Sum(l10[x0 + x]) + Sum(l11[x0 + x]);
-                }
-                // NOLINTEND(bugprone-signed-char-misuse)
-                for (uint64_t k = 0; k < pairs; ++k) {
-                    out[first + k] = T((lines[2 * k] + lines[2 * k + 1]) / Sum(8));
-                }
-            }
-        }
-        return;
-    }
+    constexpr uint64_t kChunk = 512; // integer pairs per pass: the line sums stay on the stack
+    // Zeroed only so that the analyser sees every read initialised; floats need none.
+    Sum lines[std::is_integral_v<T> ? 2 * kChunk : 1]{};
     for (uint64_t oy = 0; oy < b.outY; ++oy) {
         const T* l00 = src + ((2 * oz) * b.ny + 2 * oy) * b.nx;
         const T* l01 = l00 + b.nx;
@@ -669,27 +640,40 @@ ZM_KERNEL void meanSlice222Kernel(T* dst, const T* src, const Blocks& b, uint64_
         T* out = dst + (oz * b.outY + oy) * b.outX;
         uint64_t done = 0;
 #if defined(ZM_HAVE_AVX2_KERNELS)
-        if constexpr (std::is_same_v<T, float>) {
+        if constexpr (sizeof(T) == 2 || std::is_same_v<T, float>) {
             if (cpuHasAvx2()) {
                 done = mean222Avx2(out, l00, l01, l10, l11, b.outX);
             }
         }
 #endif
-        for (uint64_t ox = done; ox < b.outX; ++ox) {
-            const uint64_t x = 2 * ox;
-            // z, y, x order, as the general loop sums. Signed bytes are values here.
-            // NOLINTBEGIN(bugprone-signed-char-misuse)
-            Sum s = Sum(l00[x]);
-            s += Sum(l00[x + 1]);
-            s += Sum(l01[x]);
-            s += Sum(l01[x + 1]);
-            s += Sum(l10[x]);
-            s += Sum(l10[x + 1]);
-            s += Sum(l11[x]);
-            s += Sum(l11[x + 1]);
-            // NOLINTEND(bugprone-signed-char-misuse)
-            out[ox] = T(s / Sum(8));
+        // NOLINTBEGIN(bugprone-signed-char-misuse): signed bytes are values here
+        if constexpr (std::is_integral_v<T>) {
+            for (uint64_t first = done; first < b.outX; first += kChunk) {
+                const uint64_t pairs = std::min(kChunk, b.outX - first);
+                const uint64_t x0 = 2 * first;
+                for (uint64_t x = 0; x < 2 * pairs; ++x) {
+                    lines[x] = Sum(l00[x0 + x]) + Sum(l01[x0 + x]) + Sum(l10[x0 + x]) + Sum(l11[x0 + x]);
+                }
+                for (uint64_t k = 0; k < pairs; ++k) {
+                    out[first + k] = T((lines[2 * k] + lines[2 * k + 1]) / Sum(8));
+                }
+            }
+        } else {
+            for (uint64_t ox = done; ox < b.outX; ++ox) {
+                const uint64_t x = 2 * ox;
+                // z, y, x order, as the general loop sums.
+                Sum s = Sum(l00[x]);
+                s += Sum(l00[x + 1]);
+                s += Sum(l01[x]);
+                s += Sum(l01[x + 1]);
+                s += Sum(l10[x]);
+                s += Sum(l10[x + 1]);
+                s += Sum(l11[x]);
+                s += Sum(l11[x + 1]);
+                out[ox] = T(s / Sum(8));
+            }
         }
+        // NOLINTEND(bugprone-signed-char-misuse)
     }
 }
 ZM_DISPATCHED(template <class T>, meanSlice222, (T * dst, const T* src, const Blocks& b, uint64_t oz),
